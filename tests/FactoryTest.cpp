@@ -1,0 +1,67 @@
+#include "CitP/Factory.h"
+#include "Port/StringBase.h"
+
+#include <gtest/gtest.h>
+
+#include <dlfcn.h>
+
+namespace {
+constexpr Port::XUID kTestClassId{0x1111222233334444ull, 0x5555666677778888ull};
+
+int AliveInTestComponent() {
+    const std::string path = CitP::Factory::LoadedPath("venlomer_test_component");
+    void* handle = ::dlopen(path.c_str(), RTLD_NOW | RTLD_NOLOAD);
+    EXPECT_NE(handle, nullptr);
+    auto alive = reinterpret_cast<int (*)()>(::dlsym(handle, "TestComponent_Alive"));
+    const int n = alive != nullptr ? alive() : -1;
+    ::dlclose(handle); // drops only the NOLOAD reference
+    return n;
+}
+} // namespace
+
+TEST(ComponentFactory, LoadsAComponentByNameAndCreatesByClassId) {
+    ASSERT_TRUE(CitP::Factory::LoadLibraryFactory("venlomer_test_component"));
+    EXPECT_TRUE(CitP::Factory::LoadLibraryFactory("venlomer_test_component")) << "second load";
+    const int before = AliveInTestComponent();
+
+    CitI::IInterface* raw = CitP::Factory::CreateInstance(kTestClassId);
+    ASSERT_NE(raw, nullptr);
+    EXPECT_EQ(AliveInTestComponent(), before + 1);
+    auto* counter = static_cast<CommonI::IRefCount*>(raw->GetInterface(CommonI::IID_IRefCount));
+    int count = 0;
+    counter->GetRefCount(count);
+    EXPECT_EQ(count, 1);
+    counter->Release();
+    EXPECT_EQ(AliveInTestComponent(), before);
+
+    {
+        auto held = CitP::Factory::CreateInstanceRef(kTestClassId);
+        ASSERT_TRUE(held);
+        auto* c = static_cast<CommonI::IRefCount*>(held->GetInterface(CommonI::IID_IRefCount));
+        c->GetRefCount(count);
+        EXPECT_EQ(count, 1) << "the counted pointer adopts the initial reference";
+    }
+    EXPECT_EQ(AliveInTestComponent(), before);
+}
+
+TEST(ComponentFactory, RefusesUnknownNamesAndIds) {
+    EXPECT_FALSE(CitP::Factory::LoadLibraryFactory("no_such_component_anywhere"));
+    EXPECT_FALSE(CitP::Factory::LoadLibraryFactory(""));
+    EXPECT_FALSE(CitP::Factory::LoadLibraryFactory(Port::StringBase<char>("a\0b", 3)));
+    EXPECT_EQ(CitP::Factory::CreateInstance(Port::XUID(9, 9)), nullptr);
+    EXPECT_FALSE(CitP::Factory::CreateInstanceRef(Port::XUID(9, 9)));
+}
+
+TEST(ComponentFactory, FindsComponentsThroughTheSearchPathVariable) {
+    const std::string path = [] {
+        CitP::Factory::LoadLibraryFactory("venlomer_test_component");
+        return CitP::Factory::LoadedPath("venlomer_test_component");
+    }();
+    ASSERT_FALSE(path.empty());
+    const std::string dir = path.substr(0, path.rfind('/'));
+    // A path given with a slash is taken as it is.
+    EXPECT_TRUE(CitP::Factory::LoadLibraryFactory(Port::StringBase<char>(path.c_str())));
+    ::setenv("VENLOMER_COMPONENT_PATH", ("/nonexistent:" + dir).c_str(), 1);
+    EXPECT_TRUE(CitP::Factory::LoadLibraryFactory("libvenlomer_test_component.so"));
+    ::unsetenv("VENLOMER_COMPONENT_PATH");
+}
