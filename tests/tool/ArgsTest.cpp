@@ -1,0 +1,82 @@
+//===-- tests/tool/ArgsTest.cpp - option parsing and SVG text of the tool -------===//
+#include "Args.h"
+#include "Svg.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using VnTool::CommandSpec;
+using VnTool::ParsedArgs;
+
+CommandSpec Spec() {
+    return {"demo",
+            "IN [OUT]",
+            "a demonstration",
+            {{"--svg", "OUT", "picture"}, {"--quiet", "", "flag"}},
+            1,
+            2,
+            ""};
+}
+
+bool Parse(std::vector<std::string> args, ParsedArgs& out, std::string& error) {
+    return VnTool::ParseArgs(Spec(), args, out, error);
+}
+
+TEST(ToolArgs, ValuesFlagsAndOperandsAreTakenInAnyOrder) {
+    ParsedArgs out;
+    std::string error;
+    ASSERT_TRUE(Parse({"in.txt", "--svg", "a.svg", "--quiet", "--verbose"}, out, error)) << error;
+    EXPECT_EQ(out.Value("--svg"), "a.svg");
+    EXPECT_TRUE(out.Has("--quiet"));
+    EXPECT_TRUE(out.verbose);
+    EXPECT_EQ(out.operands, std::vector<std::string>{"in.txt"});
+
+    ASSERT_TRUE(Parse({"--svg=b=c.svg", "--", "-odd-name", "x"}, out, error)) << error;
+    EXPECT_EQ(out.Value("--svg"), "b=c.svg");
+    EXPECT_EQ(out.operands, (std::vector<std::string>{"-odd-name", "x"}));
+
+    // A lone dash is an operand (standard input by convention), not an option.
+    ASSERT_TRUE(Parse({"-"}, out, error)) << error;
+    EXPECT_EQ(out.operands, std::vector<std::string>{"-"});
+}
+
+TEST(ToolArgs, HelpNeedsNoOperands) {
+    ParsedArgs out;
+    std::string error;
+    ASSERT_TRUE(Parse({"--help"}, out, error));
+    EXPECT_TRUE(out.help);
+    std::string help = VnTool::HelpText(Spec());
+    EXPECT_EQ(help.rfind("usage: venlomer demo [options] IN [OUT]\n", 0), 0u) << help;
+    EXPECT_NE(help.find("--svg OUT"), std::string::npos);
+    EXPECT_NE(help.find("--verbose"), std::string::npos);
+}
+
+TEST(ToolArgs, MisuseIsRefusedWithAReason) {
+    struct Case {
+        std::vector<std::string> args;
+        const char* reason;
+    };
+    const Case cases[] = {
+        {{"in", "--nope"}, "unknown option --nope"},
+        {{"in", "--svg"}, "needs a value"},
+        {{"in", "--svg", "a", "--svg", "b"}, "given twice"},
+        {{"in", "--quiet=yes"}, "takes no value"},
+        {{}, "missing operand"},
+        {{"a", "b", "c"}, "unexpected operand c"},
+    };
+    for (const auto& c : cases) {
+        ParsedArgs out;
+        std::string error;
+        EXPECT_FALSE(Parse(c.args, out, error)) << c.reason;
+        EXPECT_NE(error.find(c.reason), std::string::npos) << error;
+    }
+}
+
+TEST(ToolSvg, TextFromOutsideIsEscaped) {
+    EXPECT_EQ(VnTool::XmlEscape("<a & 'b' \"c\">"), "&lt;a &amp; &apos;b&apos; &quot;c&quot;&gt;");
+    EXPECT_EQ(VnTool::XmlEscape(std::string("x\x01y", 3)), "x?y");
+    EXPECT_EQ(VnTool::HexColor(255, 0, 16), "#ff0010");
+}
+
+} // namespace

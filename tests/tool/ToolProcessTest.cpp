@@ -1,0 +1,399 @@
+//===-- tests/tool/ToolProcessTest.cpp - venlomer run as a program --------------===//
+//
+// Each test runs the built tool in a scratch folder of its own and judges what a user
+// sees: the exit status, the lines on stdout and stderr, and the picture, which is parsed
+// back with a real XML parser. Expected numbers come from a plain scan of the chip
+// database, not from the tool's reader.
+//
+//===------------------------------------------------------------------------------===//
+#include <expat.h>
+#include <gtest/gtest.h>
+
+#include <sys/wait.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <regex>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace {
+
+namespace fs = std::filesystem;
+
+struct Result {
+    int status = -1;
+    std::string out;
+    std::string err;
+};
+
+std::string Slurp(const fs::path& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::ostringstream text;
+    text << in.rdbuf();
+    return text.str();
+}
+
+std::string Quote(const std::string& arg) {
+    std::string quoted = "'";
+    for (char c : arg) {
+        quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
+    }
+    return quoted + "'";
+}
+
+int LineCount(const std::string& text) {
+    int lines = 0;
+    for (char c : text) {
+        lines += c == '\n' ? 1 : 0;
+    }
+    return lines;
+}
+
+class ToolProcess : public ::testing::Test {
+protected:
+    void SetUp() override {
+        std::string pattern = (fs::temp_directory_path() / "venlomer-tool-XXXXXX").string();
+        ASSERT_NE(mkdtemp(pattern.data()), nullptr);
+        m_dir = pattern;
+    }
+    void TearDown() override {
+        std::error_code ec;
+        fs::remove_all(m_dir, ec);
+    }
+
+    Result Run(const std::vector<std::string>& args, const std::string& env = "") {
+        std::string command =
+            "cd " + Quote(m_dir.string()) + " && env " + env + " " + Quote(VENLOMER_TOOL_PATH);
+        for (const auto& arg : args) {
+            command += " " + Quote(arg);
+        }
+        command +=
+            " >" + Quote((m_dir / "stdout").string()) + " 2>" + Quote((m_dir / "stderr").string());
+        Result result;
+        int raw = std::system(command.c_str());
+        result.status = WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+        result.out = Slurp(m_dir / "stdout");
+        result.err = Slurp(m_dir / "stderr");
+        return result;
+    }
+
+    fs::path m_dir;
+};
+
+// ---- what the picture holds ------------------------------------------------------------
+
+struct SvgCounts {
+    bool wellFormed = false;
+    std::string error;
+    int tiles = 0;
+    int pins = 0;
+    int highlighted = 0;
+    int elements = 0;
+};
+
+void OnStart(void* data, const XML_Char* name, const XML_Char** attributes) {
+    auto* counts = static_cast<SvgCounts*>(data);
+    ++counts->elements;
+    (void)name;
+    for (int i = 0; attributes[i] != nullptr; i += 2) {
+        if (std::string(attributes[i]) != "class") {
+            continue;
+        }
+        std::istringstream tokens(attributes[i + 1]);
+        std::string token;
+        while (tokens >> token) {
+            counts->tiles += token == "tile" ? 1 : 0;
+            counts->pins += token == "pin" ? 1 : 0;
+            counts->highlighted += token == "hl" ? 1 : 0;
+        }
+    }
+}
+
+SvgCounts ParseSvg(const fs::path& path) {
+    SvgCounts counts;
+    std::string text = Slurp(path);
+    XML_Parser parser = XML_ParserCreate(nullptr);
+    XML_SetUserData(parser, &counts);
+    XML_SetStartElementHandler(parser, OnStart);
+    counts.wellFormed =
+        XML_Parse(parser, text.data(), static_cast<int>(text.size()), 1) == XML_STATUS_OK;
+    if (!counts.wellFormed) {
+        counts.error = std::string(XML_ErrorString(XML_GetErrorCode(parser))) + " at line " +
+                       std::to_string(XML_GetCurrentLineNumber(parser));
+    }
+    XML_ParserFree(parser);
+    return counts;
+}
+
+// ---- what the chip database holds, by a plain scan -------------------------------------
+
+struct ScannedPin {
+    std::string name;
+    int x = 0;
+    int y = 0;
+};
+
+struct Scan {
+    int width = 0;
+    int height = 0;
+    int tiles = 0;
+    std::vector<ScannedPin> pins;
+};
+
+// Pins of `package`, or of the first package when it is empty.
+Scan ScanChipDb(const std::string& path, const std::string& package) {
+    Scan scan;
+    std::ifstream in(path);
+    std::string line;
+    bool inPins = false;
+    bool taken = false;
+    while (std::getline(in, line)) {
+        // Only headers and the wanted pins matter; the bulk of the file is routing.
+        if (line.empty() || (line[0] != '.' && !inPins)) {
+            continue;
+        }
+        std::istringstream fields(line);
+        std::string head;
+        fields >> head;
+        if (head.rfind(".", 0) == 0) {
+            inPins = false;
+            if (head == ".device") {
+                std::string name;
+                fields >> name >> scan.width >> scan.height;
+            } else if (head == ".logic_tile" || head == ".io_tile" || head == ".ramb_tile" ||
+                       head == ".ramt_tile") {
+                ++scan.tiles;
+            } else if (head == ".pins") {
+                std::string name;
+                fields >> name;
+                inPins = !taken && (package.empty() || name == package);
+                taken = taken || inPins;
+            }
+        } else if (inPins && !head.empty() && head[0] != '#') {
+            ScannedPin pin{head};
+            fields >> pin.x >> pin.y;
+            scan.pins.push_back(pin);
+        }
+    }
+    return scan;
+}
+
+std::string SystemChipDb(const char* name) {
+    std::string path = std::string(VENLOMER_SYSTEM_CHIPDB_DIR) + "/" + name;
+    return fs::exists(path) ? path : std::string();
+}
+
+bool Contains(const std::string& text, const std::string& part) {
+    return text.find(part) != std::string::npos;
+}
+
+// The library parts behind a subcommand may be missing from a partial build; the tool
+// then says so and the test cannot judge the subcommand.
+#define SKIP_IF_NOT_BUILT(result)                                                                  \
+    if ((result).status == 1 && Contains((result).err, "not available in this build")) {           \
+        GTEST_SKIP() << (result).err;                                                              \
+    }
+
+// ---- the tool as a whole ---------------------------------------------------------------
+
+TEST_F(ToolProcess, HelpIsGivenForTheToolAndEveryCommand) {
+    Result top = Run({"--help"});
+    EXPECT_EQ(top.status, 0);
+    const char* commands[] = {"floorplan", "colors",     "ngc-stub",
+                              "ngc-new",   "ngd-sample", "project-files"};
+    for (const char* command : commands) {
+        EXPECT_TRUE(Contains(top.out, command)) << command;
+        Result help = Run({command, "--help"});
+        EXPECT_EQ(help.status, 0) << command;
+        EXPECT_EQ(help.out.rfind(std::string("usage: venlomer ") + command, 0), 0u) << help.out;
+        EXPECT_TRUE(help.err.empty()) << help.err;
+    }
+}
+
+TEST_F(ToolProcess, BadUsageExitsWithTwoAndOneLineOfReason) {
+    const std::vector<std::vector<std::string>> cases = {
+        {},
+        {"paint"},
+        {"floorplan", "--bogus"},
+        {"floorplan", "--svg"},
+        {"floorplan", "--find", "Bank"},
+        {"floorplan", "--find", "=3"},
+        {"floorplan", "--find", "Bank=0", "--flags", "fuzzy"},
+        {"floorplan", "--flags", "exact"},
+        {"floorplan", "extra"},
+        {"ngc-stub", "only-one.ngd"},
+        {"ngc-new", "a.ngc", "design", "part"},
+        {"ngd-sample"},
+        {"colors", "--svg"},
+        {"project-files", "--project"},
+    };
+    for (const auto& args : cases) {
+        std::string shown;
+        for (const auto& arg : args) {
+            shown += arg + " ";
+        }
+        Result result = Run(args);
+        EXPECT_EQ(result.status, 2) << shown;
+        EXPECT_EQ(LineCount(result.err), 1) << shown << "\n" << result.err;
+        EXPECT_TRUE(result.out.empty()) << shown << "\n" << result.out;
+    }
+}
+
+// ---- floorplan ------------------------------------------------------------------------
+
+TEST_F(ToolProcess, FloorplanOfTheBundledDeviceDrawsEveryTileAndPin) {
+    Scan scan = ScanChipDb(VENLOMER_BUNDLED_CHIPDB, "");
+    Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB});
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, "Device demo (10 x 12 tiles)")) << result.out;
+    EXPECT_TRUE(Contains(result.out, "Floorplan written to " + (m_dir / "floorplan.svg").string()))
+        << result.out;
+    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    EXPECT_EQ(svg.tiles, scan.tiles);
+    EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
+    EXPECT_EQ(svg.highlighted, 0);
+    EXPECT_FALSE(fs::exists(m_dir / "floorplan.svg.part"));
+}
+
+TEST_F(ToolProcess, FloorplanFallsBackToTheBundledDeviceWithoutThePackage) {
+    Result result = Run({"floorplan", "--svg", "fallback.svg"},
+                        "VENLOMER_CHIPDB_DIR=" + (m_dir / "no-such-folder").string());
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, "bundled demo device")) << result.out;
+    EXPECT_TRUE(Contains(result.out, "Device demo")) << result.out;
+    EXPECT_TRUE(ParseSvg(m_dir / "fallback.svg").wellFormed);
+}
+
+TEST_F(ToolProcess, ASearchThatMatchesNothingHighlightsNothing) {
+    Scan scan = ScanChipDb(VENLOMER_BUNDLED_CHIPDB, "");
+    Result result =
+        Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--find", "Name=NO-SUCH-PIN"});
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, ": 0 matches")) << result.out;
+    EXPECT_TRUE(Contains(result.out, "Highlighted: 0 pins")) << result.out;
+    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
+    EXPECT_EQ(svg.highlighted, 0);
+}
+
+TEST_F(ToolProcess, ARegexpSearchHighlightsThePinsWhoseNameItMatchesFromTheStart) {
+    Scan scan = ScanChipDb(VENLOMER_BUNDLED_CHIPDB, "");
+    std::regex pattern("^1[0-9]");
+    int expected = 0;
+    for (const auto& pin : scan.pins) {
+        expected += std::regex_search(pin.name, pattern) ? 1 : 0;
+    }
+    ASSERT_GT(expected, 0);
+    Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--find", "Name=1[0-9]",
+                         "--flags", "regexp", "--highlight-only"});
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, ": " + std::to_string(expected) + " matches")) << result.out;
+    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    // --highlight-only leaves the other pins out of the picture.
+    EXPECT_EQ(svg.pins, expected);
+    EXPECT_EQ(svg.highlighted, expected);
+}
+
+TEST_F(ToolProcess, AWithinFivePercentSearchOnXTakesTheNeighbouringColumns) {
+    std::string chipDb = SystemChipDb("chipdb-8k.txt");
+    std::string package = chipDb.empty() ? "" : "ct256";
+    int wanted = chipDb.empty() ? 8 : 20;
+    if (chipDb.empty()) {
+        chipDb = VENLOMER_BUNDLED_CHIPDB;
+    }
+    Scan scan = ScanChipDb(chipDb, package);
+    int expected = 0;
+    int exact = 0;
+    for (const auto& pin : scan.pins) {
+        // The pin's own X is the value within 5 percent of which the wanted one must lie.
+        expected += (wanted >= pin.x - pin.x * 0.05 && pin.x + pin.x * 0.05 >= wanted) ? 1 : 0;
+        exact += pin.x == wanted ? 1 : 0;
+    }
+    std::vector<std::string> args = {
+        "floorplan", "--chipdb",        chipDb, "--find", "X=" + std::to_string(wanted),
+        "--flags",   "within-5-percent"};
+    if (!package.empty()) {
+        args.insert(args.end(), {"--package", package});
+        EXPECT_GT(expected, exact) << "column 21 lies within 5 percent of 20";
+    }
+    Result result = Run(args);
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, ": " + std::to_string(expected) + " match")) << result.out;
+    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    EXPECT_EQ(svg.highlighted, expected);
+}
+
+TEST_F(ToolProcess, ABankSearchOnTheDefaultDeviceSelectsThePinsBelowTheBank) {
+    std::string chipDb = SystemChipDb("chipdb-8k.txt");
+    if (chipDb.empty()) {
+        GTEST_SKIP() << "fpga-icestorm-chipdb is not installed";
+    }
+    Scan scan = ScanChipDb(chipDb, "ct256");
+    int top = 0;
+    for (const auto& pin : scan.pins) {
+        top += pin.y == scan.height - 1 ? 1 : 0;
+    }
+    ASSERT_GT(top, 0);
+    Result result = Run({"floorplan", "--find", "Bank=0", "--svg", "bank0.svg"});
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, "package ct256")) << result.out;
+    // The bank itself matches too; selecting it brings its pins along.
+    EXPECT_TRUE(Contains(result.out, ": " + std::to_string(top + 1) + " matches")) << result.out;
+    EXPECT_TRUE(Contains(result.out, "Selected: " + std::to_string(top + 1) + " resources"))
+        << result.out;
+    EXPECT_TRUE(Contains(result.out, "Highlighted: " + std::to_string(top) + " pins"))
+        << result.out;
+    SvgCounts svg = ParseSvg(m_dir / "bank0.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    EXPECT_EQ(svg.tiles, scan.tiles);
+    EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
+    EXPECT_EQ(svg.highlighted, top);
+}
+
+TEST_F(ToolProcess, FloorplanRefusalsExitWithOneAndSayWhy) {
+    {
+        std::ofstream(m_dir / "bad.txt") << ".device x 4 4 0\n.io_tile 9 9\n";
+        Result result = Run({"floorplan", "--chipdb", (m_dir / "bad.txt").string()});
+        SKIP_IF_NOT_BUILT(result);
+        EXPECT_EQ(result.status, 1);
+        EXPECT_TRUE(Contains(result.err, "bad.txt:2: .io_tile outside the device grid"))
+            << result.err;
+        EXPECT_FALSE(fs::exists(m_dir / "floorplan.svg"));
+    }
+    {
+        Result result =
+            Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--package", "qfn999"});
+        EXPECT_EQ(result.status, 1);
+        EXPECT_TRUE(Contains(result.err, "no package \"qfn999\"")) << result.err;
+    }
+    {
+        Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--svg",
+                             (m_dir / "missing-folder" / "x.svg").string()});
+        EXPECT_EQ(result.status, 1);
+        EXPECT_TRUE(Contains(result.err, "cannot write")) << result.err;
+    }
+}
+
+TEST_F(ToolProcess, ASearchValueThatCannotBeOfThePropertysTypeIsBadUsage) {
+    for (const char* find : {"X=abc", "Colour=red"}) {
+        Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--find", find});
+        SKIP_IF_NOT_BUILT(result);
+        EXPECT_EQ(result.status, 2) << find;
+        EXPECT_EQ(LineCount(result.err), 1) << result.err;
+    }
+}
+
+} // namespace

@@ -1,0 +1,316 @@
+//===-- tools/ChipDb.cpp - reads the tiles and package pins of a chip database --===//
+#include "ChipDb.h"
+
+#include <charconv>
+#include <fstream>
+#include <set>
+#include <unordered_map>
+#include <unordered_set>
+#include <utility>
+
+namespace VnTool {
+
+namespace {
+
+// A grid larger than this is no device of the family; refusing it keeps a corrupt size
+// from making the drawing or the tile index absurdly large.
+constexpr int kMaxGridSide = 1024;
+
+enum class Section { None, Device, Tile, WantedPins, Skipped };
+
+std::vector<std::string_view> Fields(std::string_view line) {
+    std::vector<std::string_view> fields;
+    std::size_t i = 0;
+    while (i < line.size()) {
+        while (i < line.size() && (line[i] == ' ' || line[i] == '\t')) {
+            ++i;
+        }
+        std::size_t start = i;
+        while (i < line.size() && line[i] != ' ' && line[i] != '\t') {
+            ++i;
+        }
+        if (i > start) {
+            fields.push_back(line.substr(start, i - start));
+        }
+    }
+    return fields;
+}
+
+bool ToInt(std::string_view text, int& value) {
+    auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), value);
+    return ec == std::errc() && end == text.data() + text.size();
+}
+
+bool TileKindOfSection(std::string_view name, TileKind& kind) {
+    static const std::pair<std::string_view, TileKind> kSections[] = {
+        {".logic_tile", TileKind::Logic},
+        {".io_tile", TileKind::Io},
+        {".ramb_tile", TileKind::RamBottom},
+        {".ramt_tile", TileKind::RamTop},
+    };
+    for (const auto& [section, k] : kSections) {
+        if (name == section) {
+            kind = k;
+            return true;
+        }
+    }
+    return false;
+}
+
+class Reader {
+public:
+    Reader(std::string_view source, std::string_view package, ChipDb& db)
+        : m_source(source), m_wanted(package), m_db(db) {}
+
+    bool Line(std::string_view line) {
+        ++m_line;
+        if (!line.empty() && line.back() == '\r') {
+            line.remove_suffix(1);
+        }
+        if (line.empty()) {
+            return true;
+        }
+        if (line[0] == '.') {
+            return Header(line);
+        }
+        // Nearly every line of the file lies in a routing or bit section: leave those at
+        // the first character.
+        if (m_section == Section::Skipped || line[0] == '#') {
+            return true;
+        }
+        auto fields = Fields(line);
+        if (fields.empty()) {
+            return true;
+        }
+        switch (m_section) {
+        case Section::WantedPins:
+            return PinLine(fields);
+        case Section::None:
+            return Fail("text outside any section");
+        default:
+            return Fail("unexpected line after a one-line section");
+        }
+    }
+
+    bool Finish(std::string& error) {
+        if (m_failed) {
+            error = m_error;
+            return false;
+        }
+        if (!m_seenDevice) {
+            error = std::string(m_source) + ": no .device line: not a chip database";
+            return false;
+        }
+        if (!m_wanted.empty() && m_db.package.empty()) {
+            error = std::string(m_source) + ": no package \"" + std::string(m_wanted) + "\"";
+            error += m_db.packages.empty() ? "; the file has no .pins section"
+                                           : "; the file has: " + Join(m_db.packages);
+            return false;
+        }
+        // Pins come before the tiles in the file, so their tiles are checked at the end.
+        for (Pin& pin : m_db.pins) {
+            auto it = m_tileKinds.find(Key(pin.x, pin.y));
+            if (it == m_tileKinds.end() || it->second != TileKind::Io) {
+                error = std::string(m_source) + ":" + std::to_string(pin.line) + ": pin " +
+                        pin.name + " lies on " + std::to_string(pin.x) + " " +
+                        std::to_string(pin.y) + ", which is no IO tile";
+                return false;
+            }
+            pin.bank = IoBankOf(pin.x, pin.y, m_db.width, m_db.height);
+        }
+        return true;
+    }
+
+private:
+    static std::string Join(const std::vector<std::string>& names) {
+        std::string text;
+        for (const auto& name : names) {
+            text += (text.empty() ? "" : ", ") + name;
+        }
+        return text;
+    }
+    static long long Key(int x, int y) { return (static_cast<long long>(x) << 32) | unsigned(y); }
+
+    bool Fail(const std::string& why) {
+        if (!m_failed) {
+            m_failed = true;
+            m_error = std::string(m_source) + ":" + std::to_string(m_line) + ": " + why;
+        }
+        return false;
+    }
+
+    bool Header(std::string_view line) {
+        auto fields = Fields(line);
+        std::string_view name = fields[0];
+        TileKind kind;
+        if (name == ".device") {
+            return DeviceLine(fields);
+        }
+        if (TileKindOfSection(name, kind)) {
+            return TileLine(fields, kind);
+        }
+        if (name == ".pins") {
+            return PinsHeader(fields);
+        }
+        m_section = Section::Skipped;
+        return true;
+    }
+
+    bool DeviceLine(const std::vector<std::string_view>& f) {
+        if (m_seenDevice) {
+            return Fail("a second .device line");
+        }
+        int nets = 0;
+        if (f.size() != 5 || !ToInt(f[2], m_db.width) || !ToInt(f[3], m_db.height) ||
+            !ToInt(f[4], nets)) {
+            return Fail(".device wants a name, a width, a height and a net count");
+        }
+        if (m_db.width < 1 || m_db.height < 1 || m_db.width > kMaxGridSide ||
+            m_db.height > kMaxGridSide || nets < 0) {
+            return Fail("device size out of range");
+        }
+        m_db.device = std::string(f[1]);
+        m_seenDevice = true;
+        m_section = Section::Device;
+        return true;
+    }
+
+    bool InGrid(int x, int y) const {
+        return x >= 0 && y >= 0 && x < m_db.width && y < m_db.height;
+    }
+
+    bool TileLine(const std::vector<std::string_view>& f, TileKind kind) {
+        if (!m_seenDevice) {
+            return Fail(std::string(f[0]) + " before the .device line");
+        }
+        Tile tile;
+        tile.kind = kind;
+        if (f.size() != 3 || !ToInt(f[1], tile.x) || !ToInt(f[2], tile.y)) {
+            return Fail(std::string(f[0]) + " wants two coordinates");
+        }
+        if (!InGrid(tile.x, tile.y)) {
+            return Fail(std::string(f[0]) + " outside the device grid");
+        }
+        if (!m_tileKinds.emplace(Key(tile.x, tile.y), kind).second) {
+            return Fail("a second tile at " + std::to_string(tile.x) + " " +
+                        std::to_string(tile.y));
+        }
+        m_db.tiles.push_back(tile);
+        m_section = Section::Tile;
+        return true;
+    }
+
+    bool PinsHeader(const std::vector<std::string_view>& f) {
+        if (f.size() != 2) {
+            return Fail(".pins wants one package name");
+        }
+        std::string package(f[1]);
+        for (const auto& seen : m_db.packages) {
+            if (seen == package) {
+                return Fail("package " + package + " listed twice");
+            }
+        }
+        m_db.packages.push_back(package);
+        bool wanted = m_db.package.empty() && (m_wanted.empty() || m_wanted == package);
+        if (wanted) {
+            m_db.package = package;
+        }
+        m_section = wanted ? Section::WantedPins : Section::Skipped;
+        return true;
+    }
+
+    bool PinLine(const std::vector<std::string_view>& f) {
+        if (!m_seenDevice) {
+            return Fail("pins before the .device line");
+        }
+        Pin pin;
+        if (f.size() != 4 || !ToInt(f[1], pin.x) || !ToInt(f[2], pin.y) || !ToInt(f[3], pin.pio)) {
+            return Fail("a pin line wants a pin name, two coordinates and an IO block number");
+        }
+        if (!InGrid(pin.x, pin.y)) {
+            return Fail("pin " + std::string(f[0]) + " outside the device grid");
+        }
+        if (pin.pio < 0) {
+            return Fail("pin " + std::string(f[0]) + " has a negative IO block number");
+        }
+        pin.name = std::string(f[0]);
+        if (!m_pinNames.insert(pin.name).second) {
+            return Fail("pin " + pin.name + " listed twice");
+        }
+        pin.line = m_line;
+        m_db.pins.push_back(std::move(pin));
+        return true;
+    }
+
+    std::string_view m_source;
+    std::string_view m_wanted;
+    ChipDb& m_db;
+    std::size_t m_line = 0;
+    Section m_section = Section::None;
+    bool m_seenDevice = false;
+    bool m_failed = false;
+    std::string m_error;
+    std::unordered_map<long long, TileKind> m_tileKinds;
+    std::unordered_set<std::string> m_pinNames;
+};
+
+} // namespace
+
+const char* TileKindName(TileKind kind) {
+    switch (kind) {
+    case TileKind::Logic:
+        return "logic";
+    case TileKind::Io:
+        return "io";
+    case TileKind::RamBottom:
+        return "ramb";
+    case TileKind::RamTop:
+        return "ramt";
+    }
+    return "?";
+}
+
+int IoBankOf(int x, int y, int width, int height) {
+    if (y == height - 1) {
+        return 0;
+    }
+    if (x == width - 1) {
+        return 1;
+    }
+    if (y == 0) {
+        return 2;
+    }
+    if (x == 0) {
+        return 3;
+    }
+    return -1;
+}
+
+bool ReadChipDb(std::istream& in, std::string_view source, std::string_view package, ChipDb& db,
+                std::string& error) {
+    db = ChipDb{};
+    Reader reader(source, package, db);
+    std::string line;
+    while (std::getline(in, line)) {
+        if (!reader.Line(line)) {
+            break;
+        }
+    }
+    if (in.bad()) {
+        error = std::string(source) + ": read error";
+        return false;
+    }
+    return reader.Finish(error);
+}
+
+bool ReadChipDbFile(const std::string& path, std::string_view package, ChipDb& db,
+                    std::string& error) {
+    std::ifstream in(path, std::ios::binary);
+    if (!in) {
+        error = path + ": cannot open the chip database";
+        return false;
+    }
+    return ReadChipDb(in, path, package, db, error);
+}
+
+} // namespace VnTool

@@ -1,0 +1,34 @@
+//===-- tools/Commands.h - the subcommands of venlomer --------------------------===//
+#pragma once
+
+#include "Args.h"
+
+#include <string>
+
+namespace VnTool {
+
+struct Command {
+    CommandSpec spec;
+    int (*run)(const ParsedArgs& args);
+};
+
+const Command& FloorplanCommand();
+const Command& ColorsCommand();
+const Command& NgcStubCommand();
+const Command& NgcNewCommand();
+const Command& NgdSampleCommand();
+const Command& ProjectFilesCommand();
+
+/// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
+int UsageError(const std::string& command, const std::string& why);
+/// Prints "venlomer CMD: WHY" on stderr; returns kExitRefused.
+int Refused(const std::string& command, const std::string& why);
+
+/// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
+/// then in share/venlomer beside the program's bin folder. Empty when not found.
+std::string FindDataFile(const std::string& name);
+
+/// The answer of a subcommand whose library part this build does not contain.
+int NotAvailable(const std::string& command, const std::string& what);
+
+} // namespace VnTool

@@ -1,0 +1,133 @@
+//===-- tools/Svg.cpp - a minimal SVG document writer ---------------------------===//
+#include "Svg.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+
+namespace VnTool {
+
+namespace {
+
+std::string Num(double value) {
+    char buffer[32];
+    std::snprintf(buffer, sizeof buffer, "%.2f", value);
+    std::string text(buffer);
+    // Trailing zeros only make the file bigger.
+    while (text.back() == '0') {
+        text.pop_back();
+    }
+    if (text.back() == '.') {
+        text.pop_back();
+    }
+    return text;
+}
+
+std::string Tooltip(std::string_view title) {
+    return title.empty() ? std::string() : "<title>" + XmlEscape(title) + "</title>";
+}
+
+} // namespace
+
+std::string HexColor(int red, int green, int blue) {
+    char buffer[8];
+    std::snprintf(buffer, sizeof buffer, "#%02x%02x%02x", red & 0xff, green & 0xff, blue & 0xff);
+    return buffer;
+}
+
+std::string XmlEscape(std::string_view text) {
+    std::string out;
+    out.reserve(text.size());
+    for (char c : text) {
+        switch (c) {
+        case '&':
+            out += "&amp;";
+            break;
+        case '<':
+            out += "&lt;";
+            break;
+        case '>':
+            out += "&gt;";
+            break;
+        case '"':
+            out += "&quot;";
+            break;
+        case '\'':
+            out += "&apos;";
+            break;
+        default:
+            // Control characters other than tab and newline are not allowed in XML 1.0.
+            if (static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n') {
+                out += '?';
+            } else {
+                out += c;
+            }
+        }
+    }
+    return out;
+}
+
+SvgWriter::SvgWriter(double width, double height) : m_width(width), m_height(height) {}
+
+void SvgWriter::Rect(double x, double y, double w, double h, const std::string& fill,
+                     std::string_view cssClass, std::string_view title, const std::string& stroke,
+                     double strokeWidth) {
+    m_body += "<rect class=\"" + XmlEscape(cssClass) + "\" x=\"" + Num(x) + "\" y=\"" + Num(y) +
+              "\" width=\"" + Num(w) + "\" height=\"" + Num(h) + "\" fill=\"" + fill +
+              "\" stroke=\"" + stroke + "\" stroke-width=\"" + Num(strokeWidth) + "\">" +
+              Tooltip(title) + "</rect>\n";
+}
+
+void SvgWriter::Circle(double cx, double cy, double r, const std::string& fill,
+                       std::string_view cssClass, std::string_view title, const std::string& stroke,
+                       double strokeWidth) {
+    m_body += "<circle class=\"" + XmlEscape(cssClass) + "\" cx=\"" + Num(cx) + "\" cy=\"" +
+              Num(cy) + "\" r=\"" + Num(r) + "\" fill=\"" + fill + "\" stroke=\"" + stroke +
+              "\" stroke-width=\"" + Num(strokeWidth) + "\">" + Tooltip(title) + "</circle>\n";
+}
+
+void SvgWriter::Text(double x, double y, std::string_view text, double size,
+                     std::string_view anchor) {
+    m_body += "<text x=\"" + Num(x) + "\" y=\"" + Num(y) + "\" font-size=\"" + Num(size) +
+              "\" text-anchor=\"" + XmlEscape(anchor) + "\">" + XmlEscape(text) + "</text>\n";
+}
+
+std::string SvgWriter::Finish() const {
+    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+           "<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"" +
+           Num(m_width) + "\" height=\"" + Num(m_height) + "\" viewBox=\"0 0 " + Num(m_width) +
+           " " + Num(m_height) +
+           "\" font-family=\"sans-serif\">\n"
+           "<rect class=\"background\" x=\"0\" y=\"0\" width=\"100%\" height=\"100%\" "
+           "fill=\"#ffffff\"/>\n" +
+           m_body + "</svg>\n";
+}
+
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error) {
+    // Written beside the target and renamed over it, so that a full disk or a kill never
+    // leaves a truncated picture under the name the user asked for.
+    std::string temporary = path + ".part";
+    {
+        std::ofstream out(temporary, std::ios::binary | std::ios::trunc);
+        if (!out) {
+            error = "cannot write " + path + ": " + std::strerror(errno);
+            return false;
+        }
+        out << text;
+        out.flush();
+        if (!out) {
+            error = "cannot write " + path + ": " + std::strerror(errno);
+            std::remove(temporary.c_str());
+            return false;
+        }
+    }
+    if (std::rename(temporary.c_str(), path.c_str()) != 0) {
+        error = "cannot write " + path + ": " + std::strerror(errno);
+        std::remove(temporary.c_str());
+        return false;
+    }
+    return true;
+}
+
+} // namespace VnTool

@@ -1,0 +1,112 @@
+//===-- tools/main.cpp - venlomer: the library at work without the host ---------===//
+//
+// The editor that normally hosts the library draws its device views and runs its
+// searches through it; this tool takes the same roads from the command line so that the
+// library can be tried and shown on its own.
+//
+//===------------------------------------------------------------------------------===//
+#include "Commands.h"
+
+#include "Port/MsgMan.h"
+
+#include <cstdio>
+#include <string>
+#include <vector>
+
+namespace {
+
+using VnTool::Command;
+
+const std::vector<const Command*>& AllCommands() {
+    static const std::vector<const Command*> commands = {
+        &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),    &VnTool::NgcStubCommand(),
+        &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(), &VnTool::ProjectFilesCommand(),
+    };
+    return commands;
+}
+
+void PrintToolHelp() {
+    std::printf("usage: venlomer [--verbose] COMMAND [options]\n\n"
+                "Runs the venlomer library's device-resource, search, selection, colour,\n"
+                "netlist and project services from the command line.\n\ncommands:\n");
+    for (const Command* command : AllCommands()) {
+        std::printf("  %-15s %s\n", command->spec.name.c_str(), command->spec.summary.c_str());
+    }
+    std::printf("\nRun 'venlomer COMMAND --help' for a command's options.\n"
+                "Exit status: 0 success, 1 refused operation, 2 bad usage.\n");
+}
+
+bool g_verbose = false;
+
+// Library messages share stderr with the tool's own reasons, tagged so that a reader can
+// tell which of the two spoke.
+void ShowMessage(const Port::Message& message) {
+    std::string text = message.text;
+    while (!text.empty() && text.back() == '\n') {
+        text.pop_back();
+    }
+    switch (message.severity) {
+    case Port::Severity::Error:
+        std::fprintf(stderr, "[library error] %s\n", text.c_str());
+        break;
+    case Port::Severity::Status:
+        std::fprintf(stderr, "[library] %s\n", text.c_str());
+        break;
+    case Port::Severity::Debug:
+        if (g_verbose) {
+            if (message.unit.empty()) {
+                std::fprintf(stderr, "[library debug] %s\n", text.c_str());
+            } else {
+                std::fprintf(stderr, "[library debug] %s:%d: %s\n", message.unit.c_str(),
+                             message.line, text.c_str());
+            }
+        }
+        break;
+    }
+}
+
+} // namespace
+
+int main(int argc, char** argv) {
+    std::vector<std::string> args(argv + 1, argv + argc);
+    std::size_t first = 0;
+    while (first < args.size() && (args[first] == "--verbose" || args[first] == "-v")) {
+        g_verbose = true;
+        ++first;
+    }
+    if (first == args.size()) {
+        std::fprintf(stderr, "venlomer: no command given (see venlomer --help)\n");
+        return VnTool::kExitUsage;
+    }
+    const std::string& name = args[first];
+    if (name == "--help" || name == "-h" || name == "help") {
+        PrintToolHelp();
+        return VnTool::kExitOk;
+    }
+    const Command* command = nullptr;
+    for (const Command* candidate : AllCommands()) {
+        if (candidate->spec.name == name) {
+            command = candidate;
+        }
+    }
+    if (command == nullptr) {
+        std::fprintf(stderr, "venlomer: unknown command %s (see venlomer --help)\n", name.c_str());
+        return VnTool::kExitUsage;
+    }
+    VnTool::ParsedArgs parsed;
+    std::string error;
+    std::vector<std::string> rest(args.begin() + static_cast<long>(first) + 1, args.end());
+    if (!VnTool::ParseArgs(command->spec, rest, parsed, error)) {
+        return VnTool::UsageError(name, error);
+    }
+    if (parsed.help) {
+        std::fputs(VnTool::HelpText(command->spec).c_str(), stdout);
+        return VnTool::kExitOk;
+    }
+    g_verbose = g_verbose || parsed.verbose;
+    Port::SetMessageSink(ShowMessage);
+    int status = command->run(parsed);
+    std::fflush(stdout);
+    Port::SetMessageSink({});
+    return status;
+}
