@@ -10,6 +10,7 @@
 #include "Port/MsgMan.h"
 
 #include <cstdio>
+#include <exception>
 #include <string>
 #include <vector>
 
@@ -105,7 +106,14 @@ int main(int argc, char** argv) {
     }
     g_verbose = g_verbose || parsed.verbose;
     Port::SetMessageSink(ShowMessage);
-    int status = command->run(parsed);
+    int status = VnTool::kExitRefused;
+    try {
+        status = command->run(parsed);
+    } catch (const std::exception& e) {
+        // The outside libraries may throw what the library lets pass; the user gets a
+        // reason rather than an abort.
+        std::fprintf(stderr, "venlomer %s: %s\n", name.c_str(), e.what());
+    }
     std::fflush(stdout);
     Port::SetMessageSink({});
     return status;
