@@ -447,7 +447,8 @@ std::vector<std::string> ColumnNames(VnI::IPropertyNameList* names) {
 }
 
 // One table per kind of resource among the matches, in the order the kinds first match.
-void PrintMatches(const std::vector<VnI::IPropertyHolder*>& matches) {
+void PrintMatches(const std::vector<VnI::IPropertyHolder*>& matches,
+                  VnI::IPropertyNameList* pinKind) {
     std::vector<VnI::IPropertyNameList*> kinds;
     for (auto* holder : matches) {
         bool seen = false;
@@ -459,6 +460,7 @@ void PrintMatches(const std::vector<VnI::IPropertyHolder*>& matches) {
         }
     }
     for (auto* kind : kinds) {
+        std::printf("%s:\n", kind == pinKind ? "Pins" : "Banks");
         std::vector<std::string> columns = ColumnNames(kind);
         std::vector<std::vector<std::string>> rows;
         for (auto* holder : matches) {
@@ -544,7 +546,7 @@ int Search(Model& m, const Options& options) {
                 options.findName.c_str(), options.findValue.c_str(),
                 FlagsText(options.flags).c_str(), bankCount, m.pins.size(), matches.size(),
                 matches.size() == 1 ? "match" : "matches");
-    PrintMatches(matches);
+    PrintMatches(matches, m.List(m.pinNames));
 
     // A matched bank brings the pins shown below it into the selection.
     for (auto* holder : matches) {

@@ -8,6 +8,7 @@
 //===------------------------------------------------------------------------------===//
 #include <expat.h>
 #include <gtest/gtest.h>
+#include <sqlite3.h>
 
 #include <sys/wait.h>
 
@@ -397,3 +398,139 @@ TEST_F(ToolProcess, ASearchValueThatCannotBeOfThePropertysTypeIsBadUsage) {
 }
 
 } // namespace
+
+// ---- netlist stubs --------------------------------------------------------------------
+
+namespace {
+
+// One column of the first row a query answers, or "" without a row.
+std::string QueryText(const fs::path& database, const std::string& sql) {
+    sqlite3* db = nullptr;
+    std::string text;
+    if (sqlite3_open_v2(database.c_str(), &db, SQLITE_OPEN_READONLY, nullptr) == SQLITE_OK) {
+        sqlite3_stmt* statement = nullptr;
+        if (sqlite3_prepare_v2(db, sql.c_str(), -1, &statement, nullptr) == SQLITE_OK &&
+            sqlite3_step(statement) == SQLITE_ROW) {
+            const unsigned char* value = sqlite3_column_text(statement, 0);
+            text = value != nullptr ? reinterpret_cast<const char*>(value) : "";
+        }
+        sqlite3_finalize(statement);
+    }
+    sqlite3_close(db);
+    return text;
+}
+
+struct StubContent {
+    std::string design, part, block;
+};
+
+StubContent ReadStub(const fs::path& file) {
+    return {QueryText(file, "SELECT name FROM nmod_design ORDER BY id"),
+            QueryText(file, "SELECT value FROM nmod_view_property WHERE name = 'PART'"),
+            QueryText(file, "SELECT name FROM nmod_block ORDER BY id")};
+}
+
+} // namespace
+
+TEST_F(ToolProcess, AStubIsMadeFromTheSampleNetlistWithItsThreeNames) {
+    Result sample = Run({"ngd-sample", "top.ngd", "--design", "top", "--part", "iCE40HX1K-TQ144",
+                         "--block", "top_root"});
+    SKIP_IF_NOT_BUILT(sample);
+    ASSERT_EQ(sample.status, 0) << sample.err;
+    ASSERT_TRUE(fs::exists(m_dir / "top.ngd"));
+
+    Result stub = Run({"--verbose", "ngc-stub", "top.ngd", "top.ngc"});
+    ASSERT_EQ(stub.status, 0) << stub.err;
+    EXPECT_TRUE(Contains(stub.out, "written to top.ngc")) << stub.out;
+    // The library's debug line shows only when asked for.
+    EXPECT_TRUE(Contains(stub.err, "Parttype Databook format: iCE40HX1K-TQ144")) << stub.err;
+    StubContent content = ReadStub(m_dir / "top.ngc");
+    EXPECT_EQ(content.design, "top");
+    EXPECT_EQ(content.part, "iCE40HX1K-TQ144");
+    EXPECT_EQ(content.block, "top_root");
+
+    // An existing stub counts as done and is not touched.
+    auto written = fs::last_write_time(m_dir / "top.ngc");
+    Result again = Run({"ngc-stub", "top.ngd", "top.ngc"});
+    EXPECT_EQ(again.status, 0) << again.err;
+    EXPECT_TRUE(Contains(again.out, "exists already")) << again.out;
+    EXPECT_FALSE(Contains(again.err, "Parttype")) << again.err;
+    EXPECT_EQ(fs::last_write_time(m_dir / "top.ngc"), written);
+
+    // The sample is never written over.
+    Result sampleAgain = Run({"ngd-sample", "top.ngd"});
+    EXPECT_EQ(sampleAgain.status, 1);
+    EXPECT_TRUE(Contains(sampleAgain.err, "exists already")) << sampleAgain.err;
+}
+
+TEST_F(ToolProcess, AStubFromAMissingOrForeignNetlistIsRefusedWithTheLibrarysReason) {
+    Result missing = Run({"ngc-stub", "missing.ngd", "out.ngc"});
+    SKIP_IF_NOT_BUILT(missing);
+    EXPECT_EQ(missing.status, 1);
+    EXPECT_TRUE(Contains(missing.err, "The ngd file \"missing.ngd\" was not found")) << missing.err;
+    EXPECT_FALSE(fs::exists(m_dir / "out.ngc"));
+
+    std::ofstream(m_dir / "text.ngd") << "not a database\n";
+    Result foreign = Run({"ngc-stub", "text.ngd", "out.ngc"});
+    EXPECT_EQ(foreign.status, 1);
+    EXPECT_TRUE(Contains(foreign.err, "text.ngd")) << foreign.err;
+    EXPECT_FALSE(fs::exists(m_dir / "out.ngc"));
+}
+
+TEST_F(ToolProcess, AStubIsMadeFromFourNamesInTheirOrder) {
+    Result made = Run({"ngc-new", "n.ngc", "design_d", "part_p", "block_b"});
+    SKIP_IF_NOT_BUILT(made);
+    ASSERT_EQ(made.status, 0) << made.err;
+    StubContent content = ReadStub(m_dir / "n.ngc");
+    EXPECT_EQ(content.design, "design_d");
+    EXPECT_EQ(content.part, "part_p");
+    EXPECT_EQ(content.block, "block_b");
+
+    Result again = Run({"ngc-new", "n.ngc", "other", "part", "block"});
+    EXPECT_EQ(again.status, 1);
+    EXPECT_EQ(ReadStub(m_dir / "n.ngc").design, "design_d");
+}
+
+// ---- project files --------------------------------------------------------------------
+
+TEST_F(ToolProcess, ProjectFilesComeFromTheSampleHostsProject) {
+    std::ofstream(m_dir / "top.prj") << "project \"/work/top/top.zam\"\n"
+                                        "view synth VIEW_Synthesis\n"
+                                        "view xlate VIEW_Translation\n"
+                                        "default synth\n"
+                                        "unit synth DESUT_UCF \"/work/top/\" \"top.ucf\"\n"
+                                        "binding synth xlate\n"
+                                        "unit xlate DESUT_NGD \"/work/top/\" \"top.ngd\"\n";
+    const std::string expected = "Project file:     /work/top/top.zam\n"
+                                 "Constraints file: /work/top/top.ucf\n"
+                                 "Netlist database: /work/top/top.ngd\n";
+    Result byOption = Run({"project-files", "--project", "top.prj"});
+    SKIP_IF_NOT_BUILT(byOption);
+    EXPECT_EQ(byOption.status, 0) << byOption.err;
+    EXPECT_EQ(byOption.out, expected);
+
+    Result byEnvironment =
+        Run({"--verbose", "project-files"}, "VENLOMER_PROJECT=" + (m_dir / "top.prj").string());
+    EXPECT_EQ(byEnvironment.status, 0) << byEnvironment.err;
+    EXPECT_EQ(byEnvironment.out, expected);
+    EXPECT_TRUE(Contains(byEnvironment.err, "NGD File /work/top/top.ngd")) << byEnvironment.err;
+}
+
+TEST_F(ToolProcess, ProjectFilesWithoutAFullProjectAreRefused) {
+    Result none = Run({"project-files"}, "-u VENLOMER_PROJECT");
+    SKIP_IF_NOT_BUILT(none);
+    EXPECT_EQ(none.status, 1);
+    EXPECT_TRUE(Contains(none.err, "no project open")) << none.err;
+
+    // A project whose default view has no translation view below it: the project and the
+    // constraints file are found, the netlist database is not.
+    std::ofstream(m_dir / "half.prj") << "project \"/p/half.zam\"\n"
+                                         "view synth VIEW_Synthesis\n"
+                                         "default synth\n"
+                                         "unit synth DESUT_UCF \"/p/\" \"half.ucf\"\n";
+    Result half = Run({"project-files", "--project", "half.prj"});
+    EXPECT_EQ(half.status, 1);
+    EXPECT_TRUE(Contains(half.out, "Project file:     /p/half.zam\n")) << half.out;
+    EXPECT_TRUE(Contains(half.out, "Constraints file: /p/half.ucf\n")) << half.out;
+    EXPECT_TRUE(Contains(half.out, "Netlist database: \n")) << half.out;
+}
