@@ -62,7 +62,7 @@ void TakeApart(const CommonI::RefCountPtr<VnI::ITreeNode>& root) {
             return; // not a chain of ours: stop rather than loop
         }
         parent->RemoveChild(at);
-        if (const auto after = parent->GetChildren(); after && after->CurrentItem() == node) {
+        if (at->First(); at->CurrentItem() == node) {
             return; // the removal did nothing: stop rather than loop
         }
         path.pop_back();

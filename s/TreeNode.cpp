@@ -322,6 +322,10 @@ TreeNode::CreateInstance(CommonI::RefCountPtr<VnI::ITreeNode> node) {
     return detail::AdoptCreated<VnI::ITreeNode>(new TreeNode(*source));
 }
 
+TreeNode* TreeNode::FromInterface(const VnI::ITreeNode* node) {
+    return NodeOf(node);
+}
+
 TreeNode::TreeNode(VnI::IPropertyHolder* holder, CommonI::RefCountPtr<VnI::ITreeNode> parent)
     : m_imp(new TreeNodeImp::Record(this)) {
     TreeNodeImp::SetParentLink(this, parent.Get());

@@ -46,6 +46,11 @@ public:
     static CommonI::RefCountPtr<VnI::ITreeNode>
     CreateInstance(CommonI::RefCountPtr<VnI::ITreeNode> node);
 
+    /// The public node behind a VnI::ITreeNode of this library (borrowed), or null for
+    /// null and for nodes of other libraries. This is how a caller walking a tree reaches
+    /// members that are not on the interface, such as a group node's name.
+    static TreeNode* FromInterface(const VnI::ITreeNode* node);
+
     TreeNode(VnI::IPropertyHolder* holder, CommonI::RefCountPtr<VnI::ITreeNode> parent);
     /// Deep copy: see CreateInstance(node). The copy has the source's holder (which is
     /// not told) and no parent.
