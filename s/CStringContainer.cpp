@@ -53,7 +53,8 @@ private:
 
 struct Record {
     explicit Record(CStringContainer* owner)
-        : m_owner(owner), m_xIStringContainer(this), m_xIStringIterator(this), m_xIRefCount(owner) {}
+        : m_owner(owner), m_xIStringContainer(this), m_xIStringIterator(this), m_xIRefCount(owner) {
+    }
 
     CStringContainer* m_owner;
     CStringContainer_IStringContainer m_xIStringContainer;
@@ -74,8 +75,8 @@ std::int64_t CStringContainer_IStringContainer::AddString(const Port::StringBase
     return 1;
 }
 
-std::int64_t
-CStringContainer_IStringContainer::RemoveString(const CommonI::RefCountPtr<VnI::IStringIterator>& at) {
+std::int64_t CStringContainer_IStringContainer::RemoveString(
+    const CommonI::RefCountPtr<VnI::IStringIterator>& at) {
     if (!at || at->IsEnd()) {
         return 1;
     }
@@ -88,8 +89,8 @@ CStringContainer_IStringContainer::RemoveString(const CommonI::RefCountPtr<VnI::
     return 1;
 }
 
-std::int64_t
-CStringContainer_IStringContainer::GetStringIterator(CommonI::RefCountPtr<VnI::IStringIterator>& out) {
+std::int64_t CStringContainer_IStringContainer::GetStringIterator(
+    CommonI::RefCountPtr<VnI::IStringIterator>& out) {
     out = CommonI::RefCountPtr<VnI::IStringIterator>(static_cast<VnI::IStringIterator*>(
         m_record->m_xIStringIterator.GetInterface(VnI::IID_IStringIterator)));
     return 1;
@@ -132,7 +133,9 @@ CommonI::RefCountPtr<VnI::IStringContainer> CStringContainer::CreateInstance() {
 
 CStringContainer::CStringContainer() : m_pImpl(new StringContainerImpl::Record(this)) {}
 
-CStringContainer::~CStringContainer() { delete m_pImpl; }
+CStringContainer::~CStringContainer() {
+    delete m_pImpl;
+}
 
 CitI::IInterface* CStringContainer::GetInterface(const Port::XUID& id) {
     if (m_pImpl == nullptr) {
@@ -152,8 +155,10 @@ CitI::IInterface* CStringContainer::GetInterface(const Port::XUID& id) {
 
 void CStringContainer::Dump() const {
     using detail::AddressArg;
-    detail::DumpLine(kUnit, 263, "CStringContainer::m_pImpl->m_vec = %x\n", AddressArg(&m_pImpl->m_vec));
-    detail::DumpLine(kUnit, 264, "CStringContainer::m_pImpl->m_iter = %x\n", AddressArg(&m_pImpl->m_iter));
+    detail::DumpLine(kUnit, 263, "CStringContainer::m_pImpl->m_vec = %x\n",
+                     AddressArg(&m_pImpl->m_vec));
+    detail::DumpLine(kUnit, 264, "CStringContainer::m_pImpl->m_iter = %x\n",
+                     AddressArg(&m_pImpl->m_iter));
     detail::DumpLine(kUnit, 265, "CStringContainer::m_pImpl->m_xIRefCount = %x\n",
                      AddressArg(&m_pImpl->m_xIRefCount));
     detail::DumpLine(kUnit, 267, "CStringContainer::m_pImpl->m_xIStringContainer = %x\n",

@@ -13,10 +13,10 @@ TEST(Xuid, ParsesGuidTextWithOrWithoutBracesInAnyCase) {
 }
 
 TEST(Xuid, MalformedTextGivesTheZeroId) {
-    for (const char* bad : {"", "{}", "0725c3d2-5e9b-4383-a7b6-a80c932eac2",  // one digit short
-                            "0725c3d2-5e9b-4383-a7b6-a80c932eac211",              // one too many
-                            "{0725c3d2-5e9b-4383-a7b6-a80c932eac21",              // open brace
-                            "0725c3d2+5e9b-4383-a7b6-a80c932eac21",               // wrong dash
+    for (const char* bad : {"", "{}", "0725c3d2-5e9b-4383-a7b6-a80c932eac2", // one digit short
+                            "0725c3d2-5e9b-4383-a7b6-a80c932eac211",         // one too many
+                            "{0725c3d2-5e9b-4383-a7b6-a80c932eac21",         // open brace
+                            "0725c3d2+5e9b-4383-a7b6-a80c932eac21",          // wrong dash
                             "g725c3d2-5e9b-4383-a7b6-a80c932eac21"}) {
         EXPECT_TRUE(Port::XUID(bad).IsNull()) << bad;
     }

@@ -16,12 +16,14 @@ int main() {
     }
     CommonI::RefCountPtr<VnI::IStringIterator> it;
     names->GetStringIterator(it);
-    std::printf("libvenlomer answers a string container holding %d texts:\n", names->GetNumStrings());
+    std::printf("libvenlomer answers a string container holding %d texts:\n",
+                names->GetNumStrings());
     for (it->First(); !it->IsEnd(); it->Next()) {
         std::printf("  %s\n", it->CurrentItem().c_str());
     }
     int count = 0;
-    static_cast<CommonI::IRefCount*>(names->GetInterface(CommonI::IID_IRefCount))->GetRefCount(count);
+    static_cast<CommonI::IRefCount*>(names->GetInterface(CommonI::IID_IRefCount))
+        ->GetRefCount(count);
     std::printf("references held on it: %d (the container pointer and the iterator)\n", count);
     return 0;
 }

@@ -39,7 +39,8 @@ public:
     virtual CommonI::RefCountPtr<IPropertyItr> GetProperties() = 0;
     virtual int GetNumProperties() = 0;
     /// The property stored under name (one new reference), or null.
-    virtual CommonI::RefCountPtr<IProperty> GetPropertyByName(const Port::StringBase<char>& name) = 0;
+    virtual CommonI::RefCountPtr<IProperty>
+    GetPropertyByName(const Port::StringBase<char>& name) = 0;
     /// Stores property under name. 1 when stored; 0 for a null property or no name list.
     virtual std::int64_t AddProperty(const Port::StringBase<char>& name,
                                      const CommonI::RefCountPtr<IProperty>& property,

@@ -17,7 +17,8 @@ inline constexpr Port::XUID IID_IStringContainer{0x902A53DAFEAD47AEull, 0x8A0D53
 inline constexpr Port::XUID IID_IStringIterator{0xF4E617190DCE4E67ull, 0x8491CEAE546DB067ull};
 inline constexpr Port::XUID IID_IProperty{0xA14EEF285109481Dull, 0xB46031093CB52DD8ull};
 inline constexpr Port::XUID IID_IColorProperty{0xC00B8B5350964BDFull, 0x864D610101828237ull};
-inline constexpr Port::XUID IID_IPossibleEnumValuesItr{0x2D312293D20B4891ull, 0xB5E9CD24E2E4F859ull};
+inline constexpr Port::XUID IID_IPossibleEnumValuesItr{0x2D312293D20B4891ull,
+                                                       0xB5E9CD24E2E4F859ull};
 inline constexpr Port::XUID IID_IPropertyName{0x1CA6C97AFC224851ull, 0x86480B5D021556FCull};
 inline constexpr Port::XUID IID_IPropertyNameItr{0x230BE6C346784C1Bull, 0x83C8D45BD6E9CF04ull};
 inline constexpr Port::XUID IID_IPropertyNameList{0x6DFC8E1CCBB64B68ull, 0xA6505ED29FEA5D89ull};

@@ -12,7 +12,8 @@ namespace VnTest {
 class MessageCapture {
 public:
     MessageCapture() {
-        m_previous = Port::SetMessageSink([this](const Port::Message& m) { m_messages.push_back(m); });
+        m_previous =
+            Port::SetMessageSink([this](const Port::Message& m) { m_messages.push_back(m); });
     }
     ~MessageCapture() { Port::SetMessageSink(std::move(m_previous)); }
     MessageCapture(const MessageCapture&) = delete;

@@ -21,7 +21,9 @@ public:
     }
 };
 
-CitI::IInterface* CreateTestObject() { return new TestObject(); }
+CitI::IInterface* CreateTestObject() {
+    return new TestObject();
+}
 
 } // namespace
 
@@ -29,4 +31,6 @@ extern "C" VN_VISIBLE void CitP_ComponentInit() {
     CitP::Factory::RegisterClass(kTestClassId, &CreateTestObject);
 }
 
-extern "C" VN_VISIBLE int TestComponent_Alive() { return g_alive; }
+extern "C" VN_VISIBLE int TestComponent_Alive() {
+    return g_alive;
+}

@@ -110,7 +110,9 @@ void Factory::RegisterClass(const Port::XUID& classId, CreateFunction create) {
     }
 }
 
-void Factory::UnregisterClass(const Port::XUID& classId) { RegisterClass(classId, nullptr); }
+void Factory::UnregisterClass(const Port::XUID& classId) {
+    RegisterClass(classId, nullptr);
+}
 
 CitI::IInterface* Factory::CreateInstance(const Port::XUID& classId) {
     CreateFunction create = nullptr;

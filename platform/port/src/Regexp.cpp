@@ -80,13 +80,16 @@ CompiledPtr Lookup(std::string_view pattern) {
 
 } // namespace
 
-Port_Regexp::Port_Regexp(const Port::StringBase<char>& pattern) : m_compiled(Lookup(pattern.view())) {}
+Port_Regexp::Port_Regexp(const Port::StringBase<char>& pattern)
+    : m_compiled(Lookup(pattern.view())) {}
 Port_Regexp::Port_Regexp(std::string_view pattern) : m_compiled(Lookup(pattern)) {}
 Port_Regexp::Port_Regexp(const Port_Regexp&) = default;
 Port_Regexp& Port_Regexp::operator=(const Port_Regexp&) = default;
 Port_Regexp::~Port_Regexp() = default;
 
-bool Port_Regexp::IsValid() const { return m_compiled && m_compiled->re.ok(); }
+bool Port_Regexp::IsValid() const {
+    return m_compiled && m_compiled->re.ok();
+}
 
 bool Port_Regexp::Find(std::string_view text, unsigned int* start, unsigned int* length) const {
     if (!IsValid()) {

@@ -42,21 +42,47 @@ NiftySlot<Port::detail::MessageState> s_messages;
 } // namespace
 
 namespace Port::detail {
-ClassTable& Classes() { return s_classes.Get(); }
-LibraryTable& Libraries() { return s_libraries.Get(); }
-MessageState& Messages() { return s_messages.Get(); }
+ClassTable& Classes() {
+    return s_classes.Get();
+}
+LibraryTable& Libraries() {
+    return s_libraries.Get();
+}
+MessageState& Messages() {
+    return s_messages.Get();
+}
 } // namespace Port::detail
 
-Port::FileInit::FileInit() { s_file.Acquire(); }
-Port::FileInit::~FileInit() { s_file.Drop(); }
-Port::PathListInit::PathListInit() { s_pathList.Acquire(); }
-Port::PathListInit::~PathListInit() { s_pathList.Drop(); }
-CitP::InstanceTableInit::InstanceTableInit() { s_classes.Acquire(); }
-CitP::InstanceTableInit::~InstanceTableInit() { s_classes.Drop(); }
-CitP::FactoryInit::FactoryInit() { s_libraries.Acquire(); }
-CitP::FactoryInit::~FactoryInit() { s_libraries.Drop(); }
-Port_MsgManInit::Port_MsgManInit() { s_messages.Acquire(); }
-Port_MsgManInit::~Port_MsgManInit() { s_messages.Drop(); }
+Port::FileInit::FileInit() {
+    s_file.Acquire();
+}
+Port::FileInit::~FileInit() {
+    s_file.Drop();
+}
+Port::PathListInit::PathListInit() {
+    s_pathList.Acquire();
+}
+Port::PathListInit::~PathListInit() {
+    s_pathList.Drop();
+}
+CitP::InstanceTableInit::InstanceTableInit() {
+    s_classes.Acquire();
+}
+CitP::InstanceTableInit::~InstanceTableInit() {
+    s_classes.Drop();
+}
+CitP::FactoryInit::FactoryInit() {
+    s_libraries.Acquire();
+}
+CitP::FactoryInit::~FactoryInit() {
+    s_libraries.Drop();
+}
+Port_MsgManInit::Port_MsgManInit() {
+    s_messages.Acquire();
+}
+Port_MsgManInit::~Port_MsgManInit() {
+    s_messages.Drop();
+}
 
 // The layer's own units keep the state alive for as long as the layer is loaded.
 #include "Port/UnitStartup.h"

@@ -61,7 +61,9 @@ StringBase<char>& StringBase<char>::operator+=(const StringBase& other) {
     return *this;
 }
 
-StringBase<char>& StringBase<char>::operator+=(const char* text) { return Append(text, npos); }
+StringBase<char>& StringBase<char>::operator+=(const char* text) {
+    return Append(text, npos);
+}
 
 StringBase<char>& StringBase<char>::Append(const char* text, unsigned int n) {
     m_text.append(text != nullptr ? text : "", CLength(text, n));
@@ -86,8 +88,8 @@ unsigned int StringBase<char>::GetIndexOfString(const StringBase& other, Compare
     const auto equal = [](char a, char b) {
         return FoldCase(static_cast<unsigned char>(a)) == FoldCase(static_cast<unsigned char>(b));
     };
-    const auto it = std::search(m_text.begin(), m_text.end(), other.m_text.begin(),
-                                other.m_text.end(), equal);
+    const auto it =
+        std::search(m_text.begin(), m_text.end(), other.m_text.begin(), other.m_text.end(), equal);
     return it == m_text.end() && !other.m_text.empty()
                ? npos
                : static_cast<unsigned int>(it - m_text.begin());

@@ -35,7 +35,8 @@ bool ParseGuid(const char* text, std::uint64_t& high, std::uint64_t& low) {
     std::uint64_t halves[2] = {0, 0};
     int digit = 0;
     for (int i = 0; i < 36; ++i) {
-        const bool dashHere = i == kDashes[0] || i == kDashes[1] || i == kDashes[2] || i == kDashes[3];
+        const bool dashHere =
+            i == kDashes[0] || i == kDashes[1] || i == kDashes[2] || i == kDashes[3];
         if (dashHere) {
             if (text[i] != '-') {
                 return false;
@@ -69,7 +70,8 @@ XUID::XUID(const char* guidText) {
 std::string XUID::ToString() const {
     char buffer[40];
     std::snprintf(buffer, sizeof buffer, "%08X-%04X-%04X-%04X-%012llX",
-                  static_cast<unsigned>(m_high >> 32), static_cast<unsigned>((m_high >> 16) & 0xFFFF),
+                  static_cast<unsigned>(m_high >> 32),
+                  static_cast<unsigned>((m_high >> 16) & 0xFFFF),
                   static_cast<unsigned>(m_high & 0xFFFF), static_cast<unsigned>(m_low >> 48),
                   static_cast<unsigned long long>(m_low & 0xFFFFFFFFFFFFull));
     return buffer;

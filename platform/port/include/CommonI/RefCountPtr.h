@@ -27,8 +27,15 @@ template <class T> IRefCount* CounterOf(T* p) {
     if (p == nullptr) {
         return nullptr;
     }
-    auto* base = static_cast<CitI::IInterface*>(const_cast<std::remove_const_t<T>*>(p));
-    return static_cast<IRefCount*>(base->GetInterface(IID_IRefCount));
+    auto* mutableP = const_cast<std::remove_const_t<T>*>(p);
+    if constexpr (std::is_convertible_v<std::remove_const_t<T>*, IRefCount*>) {
+        // A self-counted class is its own counter; asking through CitI::IInterface would
+        // be ambiguous there, as such a class reaches it through two bases.
+        return mutableP;
+    } else {
+        auto* base = static_cast<CitI::IInterface*>(mutableP);
+        return static_cast<IRefCount*>(base->GetInterface(IID_IRefCount));
+    }
 }
 } // namespace detail
 
@@ -89,7 +96,9 @@ public:
     T& operator*() const noexcept { return *m_ptr; }
     explicit operator bool() const noexcept { return m_ptr != nullptr; }
 
-    friend bool operator==(const RefCountPtr& a, const RefCountPtr& b) { return a.m_ptr == b.m_ptr; }
+    friend bool operator==(const RefCountPtr& a, const RefCountPtr& b) {
+        return a.m_ptr == b.m_ptr;
+    }
     friend bool operator==(const RefCountPtr& a, std::nullptr_t) { return a.m_ptr == nullptr; }
 
 private:

@@ -25,7 +25,8 @@ class VN_PORT_API Port_Regexp {
 public:
     explicit Port_Regexp(const Port::StringBase<char>& pattern);
     explicit Port_Regexp(std::string_view pattern);
-    explicit Port_Regexp(const char* pattern) : Port_Regexp(std::string_view(pattern ? pattern : "")) {}
+    explicit Port_Regexp(const char* pattern)
+        : Port_Regexp(std::string_view(pattern ? pattern : "")) {}
     Port_Regexp(const Port_Regexp&);
     Port_Regexp& operator=(const Port_Regexp&);
     ~Port_Regexp();

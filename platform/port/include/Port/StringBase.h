@@ -42,7 +42,8 @@ public:
     static constexpr unsigned int npos = 0xFFFFFFFFu;
 
     StringBase() = default;
-    StringBase(const char* text); // NOLINT(google-explicit-constructor): value type like std::string
+    StringBase(
+        const char* text); // NOLINT(google-explicit-constructor): value type like std::string
     StringBase(const char* text, unsigned int length);
     explicit StringBase(std::string_view text);
     StringBase(const StringBase&) = default;
@@ -84,7 +85,9 @@ public:
     const std::string& str() const { return m_text; }
     void Clear() { m_text.clear(); }
 
-    friend bool operator==(const StringBase& a, const StringBase& b) { return a.m_text == b.m_text; }
+    friend bool operator==(const StringBase& a, const StringBase& b) {
+        return a.m_text == b.m_text;
+    }
     friend bool operator!=(const StringBase& a, const StringBase& b) { return !(a == b); }
 
 private:

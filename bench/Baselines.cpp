@@ -1,0 +1,217 @@
+//===-- bench/Baselines.cpp - what a competent developer writes without us ------===//
+//
+// Each baseline is written as one would without this library: a property bag per
+// object (a hash map or an ordered map from name to a shared variant), the floor of one
+// hash look-up plus one vector index on plain structs, a selection kept in a std::list
+// with find-then-erase, a regular expression compiled per comparison, and a colour
+// table in an unordered_map.
+//
+//===------------------------------------------------------------------------------===//
+#include "Harness.h"
+
+#include <algorithm>
+#include <list>
+#include <map>
+#include <memory>
+#include <numeric>
+#include <random>
+#include <regex>
+#include <string>
+#include <unordered_map>
+#include <variant>
+#include <vector>
+
+namespace VnBench {
+
+namespace {
+
+using Value = std::variant<int, double, std::string, bool>;
+using Bag = std::unordered_map<std::string, std::shared_ptr<Value>>;
+using OrderedBag = std::map<std::string, std::shared_ptr<Value>>;
+
+std::vector<std::string> SixteenNames() {
+    std::vector<std::string> names;
+    for (int i = 0; i < 16; ++i) {
+        names.push_back("Prop" + std::to_string(i));
+    }
+    return names;
+}
+
+template <class BagType> void LookupInBags(benchmark::State& state) {
+    const auto names = SixteenNames();
+    std::vector<BagType> bags(GetSizes().holders);
+    for (auto& bag : bags) {
+        for (int i = 0; i < 16; ++i) {
+            bag[names[static_cast<size_t>(i)]] = std::make_shared<Value>(i);
+        }
+    }
+    size_t holder = 0;
+    size_t name = 0;
+    for (auto _ : state) {
+        auto found = bags[holder].find(names[name]);
+        std::shared_ptr<Value> value = found->second; // a bag hands out a shared value
+        benchmark::DoNotOptimize(value);
+        name = (name + 1) & 15;
+        holder = name == 0 ? (holder + 1) % bags.size() : holder;
+    }
+    SetItems(state, 1);
+}
+
+// The floor: one shared name index and a slot vector per object.
+void LookupFloor(benchmark::State& state) {
+    const auto names = SixteenNames();
+    std::unordered_map<std::string, int> index;
+    for (int i = 0; i < 16; ++i) {
+        index.emplace(names[static_cast<size_t>(i)], i);
+    }
+    struct Plain {
+        std::vector<Value*> slots;
+    };
+    std::vector<Value> values(16);
+    std::vector<Plain> objects(GetSizes().holders);
+    for (auto& object : objects) {
+        for (auto& v : values) {
+            object.slots.push_back(&v);
+        }
+    }
+    size_t holder = 0;
+    size_t name = 0;
+    for (auto _ : state) {
+        Value* value = objects[holder].slots[static_cast<size_t>(index.find(names[name])->second)];
+        benchmark::DoNotOptimize(value);
+        name = (name + 1) & 15;
+        holder = name == 0 ? (holder + 1) % objects.size() : holder;
+    }
+    SetItems(state, 1);
+}
+
+// 8 properties per object: 4 int, 2 string, 1 enumerated (kept as its text), 1 bool.
+void BagBytes(benchmark::State& state) {
+    const size_t count = GetSizes().small;
+    for (auto _ : state) {
+        const std::uint64_t before = AllocatedBytes();
+        std::vector<Bag> bags(count);
+        const std::uint64_t vectorBytes = AllocatedBytes() - before;
+        for (size_t i = 0; i < count; ++i) {
+            Bag& bag = bags[i];
+            bag["X"] = std::make_shared<Value>(static_cast<int>(i % 100));
+            bag["Y"] = std::make_shared<Value>(static_cast<int>(i / 100));
+            bag["Bank"] = std::make_shared<Value>(static_cast<int>(i % 4));
+            bag["Index"] = std::make_shared<Value>(static_cast<int>(i));
+            bag["Name"] = std::make_shared<Value>(std::string("IOB_") + std::to_string(i));
+            bag["Tile"] = std::make_shared<Value>(std::string("T") + std::to_string(i % 997));
+            bag["Type"] = std::make_shared<Value>(std::string("IO"));
+            bag["Used"] = std::make_shared<Value>(i % 2 == 0);
+        }
+        state.counters["bytes_per_object"] =
+            static_cast<double>(AllocatedBytes() - before - vectorBytes) /
+            static_cast<double>(count);
+    }
+}
+
+std::vector<Bag> PinBags(size_t count) {
+    std::vector<Bag> bags(count);
+    for (size_t i = 0; i < count; ++i) {
+        bags[i]["X"] = std::make_shared<Value>(static_cast<int>(i % 1000));
+        bags[i]["Name"] =
+            std::make_shared<Value>("Bank" + std::to_string(i % 8) + "_pin" + std::to_string(i));
+    }
+    return bags;
+}
+
+void SearchBagsIntExact(benchmark::State& state) {
+    const auto bags = PinBags(GetSizes().large);
+    const std::string name = "X";
+    for (auto _ : state) {
+        size_t matches = 0;
+        for (const Bag& bag : bags) {
+            auto found = bag.find(name);
+            if (found != bag.end() && std::get<int>(*found->second) == 500) {
+                ++matches;
+            }
+        }
+        benchmark::DoNotOptimize(matches);
+    }
+    SetItems(state, bags.size());
+}
+
+void SearchBagsStdRegexPerItem(benchmark::State& state) {
+    const auto bags = PinBags(GetSizes().regexBaseline);
+    const std::string name = "Name";
+    const std::string pattern = "BANK3_.*";
+    for (auto _ : state) {
+        size_t matches = 0;
+        for (const Bag& bag : bags) {
+            auto found = bag.find(name);
+            if (found == bag.end()) {
+                continue;
+            }
+            // As a naive search does: build the expression for every comparison.
+            const std::regex re(pattern, std::regex::icase);
+            if (std::regex_search(std::get<std::string>(*found->second), re,
+                                  std::regex_constants::match_continuous)) {
+                ++matches;
+            }
+        }
+        benchmark::DoNotOptimize(matches);
+    }
+    SetItems(state, bags.size());
+}
+
+// Select every item, then remove them one by one in a random order.
+void ListSelection(benchmark::State& state, size_t count) {
+    std::vector<int> items(count);
+    std::vector<size_t> order(count);
+    std::iota(order.begin(), order.end(), 0);
+    std::shuffle(order.begin(), order.end(), std::mt19937(1));
+    for (auto _ : state) {
+        std::list<int*> selection;
+        for (int& item : items) {
+            selection.push_back(&item);
+        }
+        for (size_t i : order) {
+            selection.erase(std::find(selection.begin(), selection.end(), &items[i]));
+        }
+        benchmark::DoNotOptimize(selection);
+    }
+    SetItems(state, count);
+}
+
+void TileColourMap(benchmark::State& state) {
+    struct Colour {
+        unsigned char r, g, b;
+    };
+    std::unordered_map<std::string, std::shared_ptr<Colour>> colours;
+    for (const char* tile :
+         {"SLICE",     "IO",       "TB_IO",       "LR_IO", "CLK",   "BRAM",  "GT",     "GT_TOP",
+          "GT_BOTTOM", "GT10_TOP", "GT10_BOTTOM", "PPC",   "EMPTY", "TERM",  "L_BUFG", "R_BUFG",
+          "T_BUFG",    "B_BUFG",   "BUFG",        "LBUFR", "RBUFR", "TBUFR", "BBUFR"}) {
+        colours.emplace(tile, std::make_shared<Colour>());
+    }
+    const std::string name = "SLICE";
+    for (auto _ : state) {
+        std::shared_ptr<Colour> colour = colours.find(name)->second;
+        benchmark::DoNotOptimize(colour);
+    }
+    SetItems(state, 1);
+}
+
+} // namespace
+
+void RegisterBaselines() {
+    const Sizes& sizes = GetSizes();
+    benchmark::RegisterBenchmark("lookup/bag_unordered_map", LookupInBags<Bag>);
+    benchmark::RegisterBenchmark("lookup/bag_map", LookupInBags<OrderedBag>);
+    benchmark::RegisterBenchmark("lookup/floor", LookupFloor);
+    benchmark::RegisterBenchmark("bytes/bag_unordered_map", BagBytes)->Iterations(1);
+    benchmark::RegisterBenchmark("search_int/bags", SearchBagsIntExact)
+        ->Iterations(sizes.tiny ? 1 : 5);
+    benchmark::RegisterBenchmark("search_regex/bags_std_regex_per_item", SearchBagsStdRegexPerItem)
+        ->Iterations(1);
+    benchmark::RegisterBenchmark("selection/list_small", ListSelection, sizes.small)->Iterations(1);
+    benchmark::RegisterBenchmark("selection/list_medium", ListSelection, sizes.medium)
+        ->Iterations(1);
+    benchmark::RegisterBenchmark("colour/unordered_map", TileColourMap);
+}
+
+} // namespace VnBench

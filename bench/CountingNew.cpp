@@ -1,0 +1,46 @@
+//===-- bench/CountingNew.cpp - a global operator new that counts bytes ---------===//
+//
+// Replacing the global allocation functions in the program replaces them for every
+// shared library it loads, so the library's own allocations are counted too.
+//
+//===------------------------------------------------------------------------------===//
+#include "Harness.h"
+
+#include <atomic>
+#include <cstdlib>
+#include <new>
+
+namespace {
+std::atomic<std::uint64_t> g_bytes{0};
+
+void* Allocate(std::size_t size) {
+    g_bytes.fetch_add(size, std::memory_order_relaxed);
+    if (void* p = std::malloc(size == 0 ? 1 : size)) {
+        return p;
+    }
+    throw std::bad_alloc();
+}
+} // namespace
+
+std::uint64_t VnBench::AllocatedBytes() {
+    return g_bytes.load(std::memory_order_relaxed);
+}
+
+void* operator new(std::size_t size) {
+    return Allocate(size);
+}
+void* operator new[](std::size_t size) {
+    return Allocate(size);
+}
+void operator delete(void* p) noexcept {
+    std::free(p);
+}
+void operator delete[](void* p) noexcept {
+    std::free(p);
+}
+void operator delete(void* p, std::size_t) noexcept {
+    std::free(p);
+}
+void operator delete[](void* p, std::size_t) noexcept {
+    std::free(p);
+}

@@ -1,0 +1,38 @@
+//===-- bench/Harness.h - sizes, allocation counting and the verdict table ------===//
+#pragma once
+
+#include <benchmark/benchmark.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+
+namespace VnBench {
+
+/// Problem sizes. The tiny set lets the test suite run every benchmark once, quickly,
+/// so the suite cannot rot; the ratios mean something only at full size.
+struct Sizes {
+    std::size_t large = 1000000; // a large device's sites and pins
+    std::size_t small = 10000;
+    std::size_t medium = 100000;       // the quadratic baselines stop here
+    std::size_t regexBaseline = 20000; // compiling std::regex per item is that slow
+    std::size_t holders = 1000;        // holders cycled through by the look-up benchmarks
+    bool tiny = false;
+};
+
+const Sizes& GetSizes();
+
+/// Bytes handed out by operator new since the process started (the benchmark program
+/// replaces the global operator new to count them).
+std::uint64_t AllocatedBytes();
+
+void RegisterBaselines();
+void RegisterLibraryBenchmarks();
+
+/// Reports ns per item through the items-per-second counter.
+inline void SetItems(benchmark::State& state, std::size_t perIteration) {
+    state.SetItemsProcessed(static_cast<std::int64_t>(state.iterations()) *
+                            static_cast<std::int64_t>(perIteration));
+}
+
+} // namespace VnBench

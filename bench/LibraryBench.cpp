@@ -1,0 +1,119 @@
+//===-- bench/LibraryBench.cpp - the library's side of each measurement ---------===//
+#include "Harness.h"
+
+#include "VnI/IManagers.h"
+#include "VnI/ITreeNode.h"
+#include "s/HighlightManager.h"
+#include "s/SelectionManager.h"
+
+#include <algorithm>
+#include <memory>
+#include <numeric>
+#include <random>
+#include <vector>
+
+namespace VnBench {
+
+namespace {
+
+// The managers only need a holder's type and flags; a minimal resource keeps the
+// measurement on the manager.
+class MinimalResource final : public VnI::IPropertyHolder, public VnI::IDeviceResource {
+public:
+    CitI::IInterface* GetInterface(const Port::XUID& id) override {
+        if (id == VnI::IID_IDeviceResource) {
+            return static_cast<VnI::IDeviceResource*>(this);
+        }
+        return id == VnI::IID_IPropertyHolder ? static_cast<VnI::IPropertyHolder*>(this) : nullptr;
+    }
+    Port::StringBase<char> GetName() override { return {}; }
+    Port::StringBase<char> GetDisplayName() override { return {}; }
+    CommonI::RefCountPtr<VnI::IPropertyItr> GetProperties() override { return nullptr; }
+    int GetNumProperties() override { return 0; }
+    CommonI::RefCountPtr<VnI::IProperty> GetPropertyByName(const Port::StringBase<char>&) override {
+        return nullptr;
+    }
+    std::int64_t AddProperty(const Port::StringBase<char>&,
+                             const CommonI::RefCountPtr<VnI::IProperty>&, bool) override {
+        return 0;
+    }
+    std::int64_t RemoveProperty(const Port::StringBase<char>&) override { return 0; }
+    CommonI::RefCountPtr<VnI::ITreeNode> GetParentTreeNode() override { return nullptr; }
+    std::int64_t SetParentTreeNode(const CommonI::RefCountPtr<VnI::ITreeNode>&) override {
+        return 0;
+    }
+    bool IsSelected() override { return m_selected; }
+    std::int64_t SetSelected(bool selected) override {
+        m_selected = selected;
+        return 0;
+    }
+    VnI::IPropertyNameList* GetPropertyNames() override { return nullptr; }
+    int GetType() const override { return 7; }
+    Port::StringBase<char> GetTileName() const override { return {}; }
+    std::int64_t GetLocation(int&, int&) const override { return 0; }
+    Port::StringBase<char> GetSiteType() const override { return {}; }
+    std::int64_t SetHighlighted(bool highlighted) override {
+        m_highlighted = highlighted;
+        return 1;
+    }
+    bool IsHighlighted() const override { return m_highlighted; }
+    CommonI::RefCountPtr<VnI::IColorProperty> GetHighlightColor() override { return nullptr; }
+
+private:
+    bool m_selected = false;
+    bool m_highlighted = false;
+};
+
+std::vector<size_t> Shuffled(size_t count) {
+    std::vector<size_t> order(count);
+    std::iota(order.begin(), order.end(), 0);
+    std::shuffle(order.begin(), order.end(), std::mt19937(1));
+    return order;
+}
+
+void SelectThenRemove(benchmark::State& state, size_t count) {
+    std::vector<MinimalResource> holders(count);
+    const auto order = Shuffled(count);
+    for (auto _ : state) {
+        Vn::Eng::SelectionManager manager;
+        for (auto& h : holders) {
+            manager.AddSelectedItem(&h, false);
+        }
+        for (size_t i : order) {
+            manager.RemoveSelectedItem(&holders[i], false);
+        }
+    }
+    SetItems(state, count);
+}
+
+void HighlightThenRemove(benchmark::State& state, size_t count) {
+    std::vector<MinimalResource> resources(count);
+    const auto order = Shuffled(count);
+    for (auto _ : state) {
+        Vn::Eng::HighlightManager manager;
+        for (auto& r : resources) {
+            manager.AddHighlightedItem(&r);
+        }
+        for (size_t i : order) {
+            manager.RemoveHighlightedItem(&resources[i]);
+        }
+    }
+    SetItems(state, count);
+}
+
+} // namespace
+
+void RegisterLibraryBenchmarks() {
+    const Sizes& sizes = GetSizes();
+    const int repeat = sizes.tiny ? 1 : 3;
+    benchmark::RegisterBenchmark("selection/ours_small", SelectThenRemove, sizes.small)
+        ->Iterations(repeat * 10);
+    benchmark::RegisterBenchmark("selection/ours_large", SelectThenRemove, sizes.large)
+        ->Iterations(repeat);
+    benchmark::RegisterBenchmark("highlight/ours_small", HighlightThenRemove, sizes.small)
+        ->Iterations(repeat * 10);
+    benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large)
+        ->Iterations(repeat);
+}
+
+} // namespace VnBench

@@ -1,0 +1,48 @@
+//===-- s/PropertyHolderItr.h - walks a list of holders in place ----------------===//
+//
+// \file
+// The iterator reads the list it was given where it stands: an element added ahead of
+// the position is seen; removing the element at the position, or destroying the list,
+// invalidates the iterator. Owners hand these out for immediate use.
+//
+//===------------------------------------------------------------------------------===//
+#pragma once
+
+#include "VnI/IPropertyHolder.h"
+#include "s/Export.h"
+
+#include <list>
+
+namespace Vn::Eng {
+
+using PropertyHolderList = std::list<VnI::IPropertyHolder*>;
+
+namespace PropertyHolderItrImp {
+struct Record;
+}
+
+class VENLOMER_API PropertyHolderItr : public VnI::IPropertyHolderItr {
+public:
+    /// A new iterator standing on the list's first element (count 1, adopted). A null list
+    /// gives an iterator that is always at its end.
+    static CommonI::RefCountPtr<VnI::IPropertyHolderItr>
+    CreateInstance(const PropertyHolderList* list);
+
+    explicit PropertyHolderItr(const PropertyHolderList* list);
+    ~PropertyHolderItr() override;
+    PropertyHolderItr(const PropertyHolderItr&) = delete;
+    PropertyHolderItr& operator=(const PropertyHolderItr&) = delete;
+
+    CitI::IInterface* GetInterface(const Port::XUID& id) override;
+    VnI::IPropertyHolder* CurrentItem() const override;
+    std::int64_t First() override;
+    std::int64_t Next() override;
+    bool IsEnd() const override;
+
+    void Dump() const;
+
+private:
+    PropertyHolderItrImp::Record* m_imp;
+};
+
+} // namespace Vn::Eng

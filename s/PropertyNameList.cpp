@@ -1,0 +1,173 @@
+//===-- s/PropertyNameList.cpp --------------------------------------------------===//
+#include "Port/UnitStartup.h"
+
+#include "s/PropertyNameList.h"
+
+#include "s/PropertyName.h"
+#include "s/PropertyNameItr.h"
+#include "s/internal/Shapes.h"
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+namespace Vn::Eng {
+
+namespace {
+const char kRevision[] = "$Revision: 1.7 $";
+const detail::Unit kUnit{"../s/PropertyNameList", kRevision};
+
+/// Hashes texts by their bytes whatever their type, so that a lookup by a caller's
+/// Port::StringBase builds no std::string: a search asks once per holder.
+struct TextHash {
+    using is_transparent = void;
+    std::size_t operator()(std::string_view text) const noexcept {
+        return std::hash<std::string_view>{}(text);
+    }
+};
+} // namespace
+
+namespace PropertyNameListImp {
+
+class PropertyNameList_IPropertyNameList final
+    : public detail::InterfaceObject<PropertyNameList, VnI::IPropertyNameList> {
+public:
+    using InterfaceObject::InterfaceObject;
+
+    int GetNumNames() const override { return m_owner->GetNumNames(); }
+    CommonI::RefCountPtr<VnI::IPropertyNameItr> GetNameItr() const override {
+        return m_owner->GetNameItr();
+    }
+    int Contains(const Port::StringBase<char>& name) const override {
+        return m_owner->Contains(name);
+    }
+    int AddName(const Port::StringBase<char>& name, VnI::PropertyType type, bool visible) override {
+        return m_owner->AddName(name, type, visible);
+    }
+    int AddEnumName(const Port::StringBase<char>& name, VnI::PropertyType type,
+                    const CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>& values,
+                    bool visible) override {
+        return m_owner->AddEnumName(name, type, values, visible);
+    }
+    std::int64_t AppendList(const VnI::IPropertyNameList* other) override {
+        return m_owner->AppendList(other);
+    }
+    std::int64_t ClearList() override { return m_owner->ClearList(); }
+    VnI::IPropertyName* GetPropertyName(int position) override {
+        return m_owner->GetPropertyName(position);
+    }
+};
+
+struct Record {
+    explicit Record(PropertyNameList* owner) : m_xIPropertyNameList(owner) {}
+
+    PropertyNameList_IPropertyNameList m_xIPropertyNameList;
+    PropertyNameItr::Names names;
+    std::unordered_map<std::string, std::uint32_t, TextHash, std::equal_to<>> m_nameIndex;
+    std::int32_t m_numVisibleNames = 0;
+};
+
+} // namespace PropertyNameListImp
+
+PropertyNameList::PropertyNameList() : m_imp(new PropertyNameListImp::Record(this)) {}
+
+PropertyNameList::~PropertyNameList() {
+    delete m_imp;
+}
+
+CitI::IInterface* PropertyNameList::GetInterface(const Port::XUID& id) {
+    if (m_imp == nullptr) {
+        return nullptr;
+    }
+    if (id == VnI::IID_IPropertyNameList || id == CitI::IID_IInterface) {
+        return &m_imp->m_xIPropertyNameList;
+    }
+    return nullptr;
+}
+
+int PropertyNameList::GetNumNames() const {
+    return static_cast<int>(m_imp->names.size());
+}
+
+VnI::IPropertyName* PropertyNameList::GetPropertyName(int position) {
+    if (position < 0 || position >= GetNumNames()) {
+        return nullptr;
+    }
+    return m_imp->names[static_cast<std::size_t>(position)].Get();
+}
+
+CommonI::RefCountPtr<VnI::IPropertyNameItr> PropertyNameList::GetNameItr() const {
+    return PropertyNameItr::CreateInstance(&m_imp->names);
+}
+
+int PropertyNameList::Contains(const Port::StringBase<char>& name) const {
+    const auto found = m_imp->m_nameIndex.find(name.view());
+    return found == m_imp->m_nameIndex.end() ? -1 : static_cast<int>(found->second);
+}
+
+int PropertyNameList::AddName(const Port::StringBase<char>& name, VnI::PropertyType type,
+                              bool visible) {
+    return AddEnumName(name, type, CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>(), visible);
+}
+
+int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::PropertyType type,
+                                  const CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>& values,
+                                  bool visible) {
+    if (Contains(name) != -1) {
+        return -1;
+    }
+    auto created = PropertyName::CreateInstance(name, type, values, visible);
+    if (!created) {
+        return -1;
+    }
+    const auto position = static_cast<std::uint32_t>(m_imp->names.size());
+    m_imp->names.push_back(std::move(created));
+    m_imp->m_nameIndex.emplace(name.str(), position);
+    if (visible) {
+        ++m_imp->m_numVisibleNames;
+    }
+    return static_cast<int>(position);
+}
+
+std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
+    if (other == nullptr) {
+        return 1;
+    }
+    // Walking by position means names this call appends (when other is this list itself)
+    // can never invalidate the walk; they are skipped as already present anyway.
+    const auto names = other->GetNameItr();
+    if (!names) {
+        return 1;
+    }
+    for (names->First(); !names->IsEnd(); names->Next()) {
+        VnI::IPropertyName* name = names->CurrentItem();
+        if (name == nullptr) {
+            continue;
+        }
+        const Port::StringBase<char> text = name->GetName();
+        if (Contains(text) == -1) {
+            AddEnumName(text, name->GetType(), name->GetPossibleValues(), name->IsVisible());
+        }
+    }
+    return 1;
+}
+
+std::int64_t PropertyNameList::ClearList() {
+    m_imp->names.clear();
+    m_imp->m_nameIndex.clear();
+    m_imp->m_numVisibleNames = 0;
+    return 1;
+}
+
+void PropertyNameList::Dump() const {
+    using detail::AddressArg;
+    detail::DumpLine(kUnit, 103, "Vn::Eng::PropertyNameList::m_imp->names = %x, numNames = %d\n",
+                     AddressArg(&m_imp->names), GetNumNames());
+    detail::DumpLine(kUnit, 104, "Vn::Eng::PropertyNameList::m_imp->m_numVisibleNames = %d\n",
+                     m_imp->m_numVisibleNames);
+}
+
+} // namespace Vn::Eng
