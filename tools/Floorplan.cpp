@@ -256,8 +256,11 @@ std::string ValueText(const Ptr<VnI::IProperty>& property) {
     }
 }
 
+bool g_usedFallbackColor = false;
+
 std::string ColorText(const Ptr<VnI::IColorProperty>& color, const char* fallback) {
     if (!color || !color->IsValid()) {
+        g_usedFallbackColor = true;
         return fallback;
     }
     return HexColor(color->GetRed(), color->GetGreen(), color->GetBlue());
@@ -667,6 +670,10 @@ int Draw(Model& m, const ChipDb& db, const Options& options) {
     std::string error;
     if (!WriteTextFile(options.svg, svg.Finish(), error)) {
         return Refused(kCommand, error);
+    }
+    if (g_usedFallbackColor) {
+        std::printf("Note: the colour scheme gave no colour for some roles; those are drawn "
+                    "grey (venlomer colors shows the scheme)\n");
     }
     std::error_code ec;
     auto where = std::filesystem::absolute(options.svg, ec);

@@ -15,7 +15,9 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <regex>
+#include <set>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -93,16 +95,23 @@ struct SvgCounts {
     int pins = 0;
     int highlighted = 0;
     int elements = 0;
+    std::map<std::string, std::set<std::string>> fillsByClass;
 };
 
 void OnStart(void* data, const XML_Char* name, const XML_Char** attributes) {
     auto* counts = static_cast<SvgCounts*>(data);
     ++counts->elements;
     (void)name;
+    std::string cssClass;
+    std::string fill;
     for (int i = 0; attributes[i] != nullptr; i += 2) {
+        if (std::string(attributes[i]) == "fill") {
+            fill = attributes[i + 1];
+        }
         if (std::string(attributes[i]) != "class") {
             continue;
         }
+        cssClass = attributes[i + 1];
         std::istringstream tokens(attributes[i + 1]);
         std::string token;
         while (tokens >> token) {
@@ -110,6 +119,9 @@ void OnStart(void* data, const XML_Char* name, const XML_Char** attributes) {
             counts->pins += token == "pin" ? 1 : 0;
             counts->highlighted += token == "hl" ? 1 : 0;
         }
+    }
+    if (!cssClass.empty()) {
+        counts->fillsByClass[cssClass].insert(fill);
     }
 }
 
@@ -533,4 +545,119 @@ TEST_F(ToolProcess, ProjectFilesWithoutAFullProjectAreRefused) {
     EXPECT_TRUE(Contains(half.out, "Project file:     /p/half.zam\n")) << half.out;
     EXPECT_TRUE(Contains(half.out, "Constraints file: /p/half.ucf\n")) << half.out;
     EXPECT_TRUE(Contains(half.out, "Netlist database: \n")) << half.out;
+}
+
+// ---- colours --------------------------------------------------------------------------
+
+namespace {
+
+struct PrintedScheme {
+    int colours = 0;  // every colour line printed
+    int declared = 0; // the sum of the "(N)" counts plus the single colours
+    bool countsAgree = true;
+};
+
+PrintedScheme ReadPrintedScheme(const std::string& out) {
+    PrintedScheme scheme;
+    std::istringstream lines(out);
+    std::string line;
+    int expectedInGroup = -1;
+    int inGroup = 0;
+    std::smatch match;
+    const std::regex header(R"(^[A-Z][A-Za-z -]+ \((\d+)\):$)");
+    auto closeGroup = [&] {
+        if (expectedInGroup >= 0 && inGroup != expectedInGroup) {
+            scheme.countsAgree = false;
+        }
+    };
+    while (std::getline(lines, line)) {
+        if (line.rfind("  ", 0) == 0) {
+            ++scheme.colours;
+            ++inGroup;
+        } else if (std::regex_match(line, match, header)) {
+            closeGroup();
+            expectedInGroup = std::stoi(match[1]);
+            scheme.declared += expectedInGroup;
+            inGroup = 0;
+        } else if (line == "Single colours:") {
+            closeGroup();
+            expectedInGroup = 3;
+            scheme.declared += 3;
+            inGroup = 0;
+        }
+    }
+    closeGroup();
+    return scheme;
+}
+
+} // namespace
+
+TEST_F(ToolProcess, ColorsPrintsTheLoadedSchemeAndDrawsOneSwatchPerColour) {
+    Result result = Run({"colors", "--svg", "scheme.svg"});
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    std::smatch match;
+    ASSERT_TRUE(std::regex_search(result.out, match,
+                                  std::regex("Colour scheme: read from (.*rareroded\\.acd)\n")))
+        << result.out;
+    EXPECT_TRUE(fs::exists(match[1].str()));
+    PrintedScheme scheme = ReadPrintedScheme(result.out);
+    EXPECT_TRUE(scheme.countsAgree) << result.out;
+    EXPECT_EQ(scheme.colours, scheme.declared);
+    EXPECT_GT(scheme.colours, 3);
+    // The roles the floorplan colours by are in the default scheme.
+    for (const char* type : {"SLICE", "TB_IO", "LR_IO", "BRAM"}) {
+        EXPECT_TRUE(std::regex_search(result.out,
+                                      std::regex(std::string("\n  ") + type + " +#[0-9a-f]{6}\n")))
+            << type;
+    }
+
+    std::string svgText = Slurp(m_dir / "scheme.svg");
+    SvgCounts svg = ParseSvg(m_dir / "scheme.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    int swatches = 0;
+    for (std::size_t at = 0; (at = svgText.find("class=\"swatch", at)) != std::string::npos; ++at) {
+        ++swatches;
+    }
+    EXPECT_EQ(swatches, scheme.colours);
+}
+
+TEST_F(ToolProcess, ColorsSaysWhenTheSchemeFileIsRejected) {
+    std::ofstream(m_dir / "rareroded.acd") << "this is not a key file\n";
+    Result result = Run({"colors"}, "VENLOMER_DATA_PATH=" + m_dir.string());
+    SKIP_IF_NOT_BUILT(result);
+    EXPECT_EQ(result.status, 0) << result.err;
+    EXPECT_TRUE(Contains(result.out, (m_dir / "rareroded.acd").string() + " was rejected"))
+        << result.out;
+    EXPECT_TRUE(Contains(result.out, "Generic colours (0):")) << result.out;
+    EXPECT_TRUE(Contains(result.out, "  tile                 (none)")) << result.out;
+}
+
+TEST_F(ToolProcess, FloorplanColoursEveryRoleWithTheSchemesColour) {
+    Result scheme = Run({"colors"});
+    SKIP_IF_NOT_BUILT(scheme);
+    ASSERT_EQ(scheme.status, 0) << scheme.err;
+    // The colour printed on the line "  NAME  #rrggbb" that follows the group's header.
+    auto colourOf = [&](const std::string& group, const std::string& name) {
+        std::size_t from = scheme.out.find(group);
+        std::smatch match;
+        std::string rest = from == std::string::npos ? "" : scheme.out.substr(from);
+        std::regex line("\n  " + name + " +(#[0-9a-f]{6})\n");
+        return std::regex_search(rest, match, line) ? match[1].str() : std::string("?");
+    };
+    Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--find", "Bank=0"});
+    ASSERT_EQ(result.status, 0) << result.err;
+    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+    ASSERT_TRUE(svg.wellFormed) << svg.error;
+    using Fills = std::set<std::string>;
+    EXPECT_EQ(svg.fillsByClass["tile logic"], Fills{colourOf("Tile types", "SLICE")});
+    EXPECT_EQ(svg.fillsByClass["tile ramb"], Fills{colourOf("Tile types", "BRAM")});
+    EXPECT_EQ(svg.fillsByClass["tile ramt"], Fills{colourOf("Tile types", "BRAM")});
+    EXPECT_EQ(svg.fillsByClass["tile io"],
+              (Fills{colourOf("Tile types", "TB_IO"), colourOf("Tile types", "LR_IO")}));
+    // Bank 0 is highlighted in the first path colour; the other banks keep theirs.
+    EXPECT_EQ(svg.fillsByClass["pin hl"], Fills{colourOf("Selected-path colours", "0")});
+    EXPECT_EQ(svg.fillsByClass["pin"],
+              (Fills{colourOf("IO bank colours", "1"), colourOf("IO bank colours", "2"),
+                     colourOf("IO bank colours", "3")}));
 }
