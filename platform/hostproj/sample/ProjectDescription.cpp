@@ -1,9 +1,13 @@
 //===-- sample/ProjectDescription.cpp - reading a project description ----------===//
+#include "Port/UnitStartup.h"
+
 #include "ProjectDescription.h"
 
+#include <algorithm>
 #include <array>
 #include <optional>
 #include <unordered_map>
+#include <utility>
 
 namespace SampleHost {
 
