@@ -54,7 +54,7 @@ TEST(HostInterfaces, OperationsSitInTheirPublishedSlots) {
     using VnTest::SlotOf;
     EXPECT_EQ(SlotOf(&Prjrep::IRefCount::AddRef), 3);
     EXPECT_EQ(SlotOf(&Prjrep::IRefCount::Release), 4);
-    for (auto slots :
+    for (const auto& slots :
          {std::vector<std::ptrdiff_t>{
               SlotOf(&Prjrep::IIterator::CurrentItem), SlotOf(&Prjrep::IIterator::First),
               SlotOf(&Prjrep::IIterator::Next), SlotOf(&Prjrep::IIterator::IsEnd)},
