@@ -77,7 +77,7 @@ TEST(HostInterfaces, OperationsSitInTheirPublishedSlots) {
 namespace {
 
 // A host object that counts through one interface only, or none.
-class Counted final : public CitI::IInterface {
+class Counted final : public Dpm::IViewType {
 public:
     enum class Via { Prjrep, Common, Nothing };
     explicit Counted(Via via) : m_via(via), m_prjrep(this), m_common(this) {}
@@ -88,7 +88,7 @@ public:
         if (id == CommonI::IID_IRefCount && m_via != Via::Nothing) {
             return &m_common; // answered by both kinds: the Prjrep counter must win
         }
-        return id == Dpm::IView::IID() ? this : nullptr;
+        return id == Dpm::IViewType::IID() ? this : nullptr;
     }
     int prjrepReleases = 0;
     int commonReleases = 0;
@@ -136,12 +136,12 @@ TEST(HostInterfaces, AutoReleaseReleasesOnceThroughThePreferredCounterAndAutoCas
         Prjrep::AutoRelease<CitI::IInterface> a(&both);
         Prjrep::AutoRelease<CitI::IInterface> b(&common);
         Prjrep::AutoRelease<CitI::IInterface> c(&neither); // nothing to call: no crash
-        Prjrep::AutoCast<Dpm::IView> view(a);
+        Prjrep::AutoCast<Dpm::IViewType> view(a);
         EXPECT_EQ(view.Get(), static_cast<CitI::IInterface*>(&both));
-        Prjrep::AutoCast<Dpm::IView> again(view);
+        Prjrep::AutoCast<Dpm::IViewType> again(view);
         EXPECT_TRUE(again);
-        EXPECT_FALSE(Prjrep::AutoCast<Dpm::IHdlFile>(a)) << "a view is no file";
-        EXPECT_FALSE(Prjrep::AutoCast<Dpm::IView>(static_cast<CitI::IInterface*>(nullptr)));
+        EXPECT_FALSE(Prjrep::AutoCast<Dpm::IHdlFile>(a)) << "a view type is no file";
+        EXPECT_FALSE(Prjrep::AutoCast<Dpm::IViewType>(static_cast<CitI::IInterface*>(nullptr)));
     }
     EXPECT_EQ(both.prjrepReleases, 1);
     EXPECT_EQ(both.commonReleases, 0);
