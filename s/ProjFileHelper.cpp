@@ -181,11 +181,10 @@ Dpm::IView* FindViewByType(Dpm::IView* start, const Text& wanted) {
     std::unordered_set<Dpm::IView*> searched{start};
     std::vector<std::unique_ptr<SearchFrame>> path;
     path.push_back(OpenFrame(start));
-    bool fresh = true; // the top frame has not yet moved to its first binding instance
     while (!path.empty()) {
         SearchFrame& frame = *path.back();
-        if (fresh || (frame.views && frame.views->IsEnd())) {
-            fresh = false;
+        // A new frame has no views yet; a frame whose views are used up moves on.
+        if (!frame.views || frame.views->IsEnd()) {
             if (!NextViews(frame)) {
                 path.pop_back();
                 if (!path.empty()) {
@@ -208,7 +207,6 @@ Dpm::IView* FindViewByType(Dpm::IView* start, const Text& wanted) {
         }
         if (searched.insert(view.Get()).second) {
             path.push_back(OpenFrame(view.Get()));
-            fresh = true;
         } else {
             frame.views->Next();
         }

@@ -311,7 +311,7 @@ binding m a
 
 TEST_F(ProjectLookup, WalksAVeryDeepChainOfViewsWithoutRecursing) {
     constexpr int kDepth = 20000;
-    std::string text = "project p.zam\ndefault v0\nunit v0 DESUT_UCF /d/ a.ucf\n";
+    std::string text = "project p.zam\r\ndefault v0\n  unit v0 DESUT_UCF /d/ a.ucf\n";
     for (int i = 0; i < kDepth; ++i) {
         text += "view v" + std::to_string(i) + " VIEW_Step\n";
         text += "binding v" + std::to_string(i) + " v" + std::to_string(i + 1) + "\n";
@@ -351,6 +351,33 @@ TEST_F(ProjectLookup, AMalformedDescriptionIsReportedWithItsLineAndOpensNoProjec
     EXPECT_THAT(result.errors[0], HasSubstr("line 3: unterminated quoted word"));
     EXPECT_THAT(result.debug, ElementsAre("Cannot get IProject Interface\n"));
     ExpectEverythingReleased();
+}
+
+TEST_F(ProjectLookup, RefusesEveryKindOfMalformedLineNamingIt) {
+    const std::vector<std::pair<std::string, std::string>> cases = {
+        {"project a.zam\nbogus x\n", "line 2: unknown directive 'bogus'"},
+        {"\n# fine\nproject a\"b\n", "line 3: a quote inside a bare word"},
+        {"project \"a\"b\n", "line 1: a quoted word must be followed by a blank"},
+        {"project a.zam\nproject b.zam\n", "line 2: a second project line"},
+        {"project\n", "line 1: project takes one file name"},
+        {"view a X\nview a Y\n", "line 2: view 'a' declared twice"},
+        {"view a X first\n", "line 1: view takes a name"},
+        {"view a X\nunit a T d\n", "line 2: unit takes a view"},
+        {"view a X\nunit a T d f no-such\n", "line 2: unknown unit option 'no-such'"},
+        {"fail everything\n", "line 1: unknown step 'everything'"},
+        {"counting twice\n", "line 1: counting takes prjrep or common"},
+        {"view a X\nbinding a b c\nview b X\n", "line 2: no view named 'c'"},
+    };
+    for (const auto& [text, reason] : cases) {
+        SCOPED_TRACE(text);
+        Describe(text);
+        const Lookup result = Run();
+        EXPECT_FALSE(result.found);
+        ASSERT_EQ(result.errors.size(), 1u);
+        EXPECT_THAT(result.errors[0], HasSubstr(reason));
+        EXPECT_THAT(result.debug, ElementsAre("Cannot get IProject Interface\n"));
+        ExpectEverythingReleased();
+    }
 }
 
 TEST_F(ProjectLookup, AnUnknownViewIsReportedAtTheFirstLineThatUsesIt) {

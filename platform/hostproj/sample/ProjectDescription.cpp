@@ -1,9 +1,13 @@
 //===-- sample/ProjectDescription.cpp - reading a project description ----------===//
+#include "Port/UnitStartup.h"
+
 #include "ProjectDescription.h"
 
+#include <algorithm>
 #include <array>
 #include <optional>
 #include <unordered_map>
+#include <utility>
 
 namespace SampleHost {
 
@@ -233,10 +237,12 @@ bool ParseDescription(std::string_view text, Description& out, ParseError& error
         out.hasDefault = true;
     }
     std::vector<std::size_t> unitViews;
+    unitViews.reserve(units.size());
     for (const PendingUnit& pending : units) {
         unitViews.push_back(resolve(pending.view));
     }
     std::vector<std::pair<std::size_t, std::vector<std::size_t>>> bindingViews;
+    bindingViews.reserve(bindings.size());
     for (const PendingBinding& pending : bindings) {
         std::vector<std::size_t> produced;
         for (const PendingName& name : pending.produced) {
