@@ -117,6 +117,13 @@ public:
                 return false;
             }
             pin.bank = IoBankOf(pin.x, pin.y, m_db.width, m_db.height);
+            // Banks are edges; a pin inside the grid would belong to none.
+            if (pin.bank < 0) {
+                error = std::string(m_source) + ":" + std::to_string(pin.line) + ": pin " +
+                        pin.name + " lies on IO tile " + std::to_string(pin.x) + " " +
+                        std::to_string(pin.y) + ", which is on no edge of the device";
+                return false;
+            }
         }
         return true;
     }

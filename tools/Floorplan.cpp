@@ -500,7 +500,9 @@ void PrintMatches(const std::vector<VnI::IPropertyHolder*>& matches,
     }
 }
 
-int Search(Model& m, const Options& options) {
+// The value to search for, typed after the property it is compared with. Null after a
+// usage error has been reported.
+int MakeWanted(Model& m, const Options& options, Ptr<VnI::IProperty>& wanted) {
     // The wanted value takes the type the pins (or banks) declare for that name, since a
     // property only equals a property of its own type.
     Text name(options.findName.c_str());
@@ -515,7 +517,6 @@ int Search(Model& m, const Options& options) {
         return UsageError(kCommand, "pins and banks have no property \"" + options.findName +
                                         "\"; they have Name, Bank, Tile, X, Y, Block, Edge, Pins");
     }
-    Ptr<VnI::IProperty> wanted;
     if (declaring->GetPropertyName(position)->GetType() == VnI::INT_TYPE) {
         int value = 0;
         const std::string& text = options.findValue;
@@ -529,7 +530,11 @@ int Search(Model& m, const Options& options) {
         wanted =
             Adopt(Vn::Eng::PropertyFactory::CreateStringProperty(options.findValue.c_str(), true));
     }
+    return kExitOk;
+}
 
+void Search(Model& m, const Options& options, const Ptr<VnI::IProperty>& wanted) {
+    Text name(options.findName.c_str());
     std::list<VnI::IPropertyHolder*> candidates;
     int bankCount = 0;
     for (auto* bank : m.banks) {
@@ -569,7 +574,6 @@ int Search(Model& m, const Options& options) {
     std::printf("Selected: %d resources (category 7, pins below matched banks included)\n",
                 selected);
     std::printf("Highlighted: %d pins\n", highlighted);
-    return kExitOk;
 }
 
 int Draw(Model& m, const ChipDb& db, const Options& options) {
@@ -691,26 +695,30 @@ int Run(const ParsedArgs& args) {
         return status;
     }
 #if defined(VENLOMER_TOOL_FLOORPLAN)
-    if (!options.note.empty()) {
-        std::printf("Note: %s\n", options.note.c_str());
-    }
     ChipDb db;
     std::string error;
     if (!ReadChipDbFile(options.chipDb, options.package, db, error)) {
         return Refused(kCommand, error);
     }
+    Model model;
+    BuildResources(db, model);
+    Ptr<VnI::IProperty> wanted;
+    if (options.search) {
+        if (int status = MakeWanted(model, options, wanted); status != kExitOk) {
+            return status;
+        }
+    }
+    if (!options.note.empty()) {
+        std::printf("Note: %s\n", options.note.c_str());
+    }
     std::printf("Device %s (%d x %d tiles) from %s, package %s: %zu tiles, %zu pins\n",
                 db.device.c_str(), db.width, db.height, options.chipDb.c_str(),
                 db.package.empty() ? "(none)" : db.package.c_str(), db.tiles.size(),
                 db.pins.size());
-    Model model;
-    BuildResources(db, model);
     BuildTree(model);
     PrintTree(model);
     if (options.search) {
-        if (int status = Search(model, options); status != kExitOk) {
-            return status;
-        }
+        Search(model, options, wanted);
     }
     return Draw(model, db, options);
 #else

@@ -10,8 +10,11 @@
 #include "Port/MsgMan.h"
 
 #include <cstdio>
+#include <cstdlib>
 #include <exception>
+#include <filesystem>
 #include <string>
+#include <unistd.h>
 #include <vector>
 
 namespace {
@@ -66,9 +69,33 @@ void ShowMessage(const Port::Message& message) {
     }
 }
 
+// The library reads its colour scheme while it is loaded, before main runs, and finds it
+// along VENLOMER_DATA_PATH. A program run from a build tree has its data beside it in
+// ../share/venlomer, which the library does not know; so when the variable is unset the
+// tool starts itself again once with the variable pointing there.
+void FindOwnDataOrRestart(char** argv) {
+    namespace fs = std::filesystem;
+    if (std::getenv("VENLOMER_DATA_PATH") != nullptr) {
+        return;
+    }
+    std::error_code ec;
+    fs::path self = fs::read_symlink("/proc/self/exe", ec);
+    if (ec) {
+        return;
+    }
+    fs::path data = self.parent_path().parent_path() / "share" / "venlomer";
+    if (!fs::is_regular_file(data / "rareroded.acd", ec)) {
+        return;
+    }
+    setenv("VENLOMER_DATA_PATH", data.c_str(), 1);
+    execv(self.c_str(), argv);
+    // Running on without the scheme beats not running: the output says what is missing.
+}
+
 } // namespace
 
 int main(int argc, char** argv) {
+    FindOwnDataOrRestart(argv);
     std::vector<std::string> args(argv + 1, argv + argc);
     std::size_t first = 0;
     while (first < args.size() && (args[first] == "--verbose" || args[first] == "-v")) {

@@ -183,6 +183,7 @@ TEST(ChipDbReader, MalformedInputIsRefusedWithTheLine) {
         // The pin's tile is checked once all tiles are known; the pin's own line is named.
         {".device a 4 4 0\n.pins p\n\nA1 1 1 0\n.logic_tile 1 1\n", "test.txt:4:", "no IO tile"},
         {".device a 4 4 0\n.pins p\nA1 0 2 0\n", "test.txt:3:", "no IO tile"},
+        {".device a 4 4 0\n.pins p\nA1 1 2 0\n.io_tile 1 2\n", "test.txt:3:", "on no edge"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.text);

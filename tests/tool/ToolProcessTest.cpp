@@ -406,6 +406,8 @@ TEST_F(ToolProcess, ASearchValueThatCannotBeOfThePropertysTypeIsBadUsage) {
         SKIP_IF_NOT_BUILT(result);
         EXPECT_EQ(result.status, 2) << find;
         EXPECT_EQ(LineCount(result.err), 1) << result.err;
+        EXPECT_TRUE(result.out.empty()) << result.out;
+        EXPECT_FALSE(fs::exists(m_dir / "floorplan.svg"));
     }
 }
 
