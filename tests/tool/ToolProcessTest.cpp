@@ -663,3 +663,13 @@ TEST_F(ToolProcess, FloorplanColoursEveryRoleWithTheSchemesColour) {
               (Fills{colourOf("IO bank colours", "1"), colourOf("IO bank colours", "2"),
                      colourOf("IO bank colours", "3")}));
 }
+
+TEST_F(ToolProcess, TheProgramFindsTheSchemeBesideItWithoutTheDataPath) {
+    Result result = Run({"colors"}, "-u VENLOMER_DATA_PATH");
+    SKIP_IF_NOT_BUILT(result);
+    ASSERT_EQ(result.status, 0) << result.err;
+    fs::path beside =
+        fs::path(VENLOMER_TOOL_PATH).parent_path().parent_path() / "share" / "venlomer";
+    EXPECT_TRUE(Contains(result.out, "read from " + (beside / "rareroded.acd").string()))
+        << result.out;
+}
