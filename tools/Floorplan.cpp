@@ -270,8 +270,10 @@ std::string ColorText(const Ptr<VnI::IColorProperty>& color, const char* fallbac
 // managers let go of their plain pointers first, the model takes the tree apart, then the
 // resources (which hold their tree nodes) go.
 struct Model {
+    // The enumerated property's choices: declared first so that they outlive every
+    // property and name that refers to them.
+    std::vector<Text> tileTypes;
     Vn::Eng::PropertyNameList deviceNames, bankNames, tileNames, pinNames;
-    std::vector<Text> tileTypes; // the enumerated property's choices; outlives the properties
     std::vector<std::unique_ptr<ToolResource>> resources;
     ToolResource* device = nullptr;
     std::vector<ToolResource*> banks; // by bank number; null where the device has none
@@ -566,8 +568,9 @@ void Search(Model& m, const Options& options, const Ptr<VnI::IProperty>& wanted)
         VnI::IPropertyHolder* holder = it->CurrentItem();
         ++selected;
         if (holder->GetPropertyNames() == m.List(m.pinNames)) {
-            auto resource = CommonI::QueryInterface<VnI::IDeviceResource>(holder);
-            m.highlight.AddHighlightedItem(resource.Get());
+            // Resources are not counted: the plain interface pointer is all there is.
+            m.highlight.AddHighlightedItem(static_cast<VnI::IDeviceResource*>(
+                holder->GetInterface(VnI::IDeviceResource::kIID)));
             ++highlighted;
         }
     }
@@ -747,6 +750,8 @@ const Command& FloorplanCommand() {
          "Bank, Edge, Pins. Compare flags: exact, ignore-case, substring, within-5-percent,\n"
          "less, greater, any, regexp (combinable, e.g. --flags regexp,ignore-case).\n"
          "A matched bank selects the pins below it in the tree.\n"
+         "Without --chipdb, chipdb-8k.txt is taken from /usr/share/fpga-icestorm/chipdb (or\n"
+         "the folder in VENLOMER_CHIPDB_DIR), else the bundled demo device.\n"
          "Example: venlomer floorplan --find Bank=0 --svg bank0.svg\n"},
         Run};
     return command;

@@ -41,17 +41,6 @@ TEST(ToolArgs, ValuesFlagsAndOperandsAreTakenInAnyOrder) {
     EXPECT_EQ(out.operands, std::vector<std::string>{"-"});
 }
 
-TEST(ToolArgs, HelpNeedsNoOperands) {
-    ParsedArgs out;
-    std::string error;
-    ASSERT_TRUE(Parse({"--help"}, out, error));
-    EXPECT_TRUE(out.help);
-    std::string help = VnTool::HelpText(Spec());
-    EXPECT_EQ(help.rfind("usage: venlomer demo [options] IN [OUT]\n", 0), 0u) << help;
-    EXPECT_NE(help.find("--svg OUT"), std::string::npos);
-    EXPECT_NE(help.find("--verbose"), std::string::npos);
-}
-
 TEST(ToolArgs, MisuseIsRefusedWithAReason) {
     struct Case {
         std::vector<std::string> args;
