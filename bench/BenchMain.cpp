@@ -144,6 +144,7 @@ int main(int argc, char** argv) {
     benchmark::Initialize(&count, args.data());
     VnBench::RegisterBaselines();
     VnBench::RegisterLibraryBenchmarks();
+    VnBench::RegisterHolderBenchmarks();
     VnBench::CollectingReporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     benchmark::Shutdown();

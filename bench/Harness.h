@@ -28,6 +28,7 @@ std::uint64_t AllocatedBytes();
 
 void RegisterBaselines();
 void RegisterLibraryBenchmarks();
+void RegisterHolderBenchmarks();
 
 /// Reports ns per item through the items-per-second counter.
 inline void SetItems(benchmark::State& state, std::size_t perIteration) {

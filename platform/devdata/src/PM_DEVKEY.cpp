@@ -1,0 +1,334 @@
+//===-- PM_DEVKEY.cpp -----------------------------------------------------------===//
+#include "Port/UnitStartup.h"
+
+#include "devdata/PM_DEVKEY.h"
+
+#include "Port/MsgMan.h"
+
+#include <algorithm>
+#include <climits>
+#include <cstdint>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+namespace {
+
+const char kRevision[] = "$Revision: 1.1 $";
+const char kDomain[] = "devdata";
+const char kUnit[] = "PM_DEVKEY";
+
+// The characters that may join integers in a value. Keeping the set small lets a typo
+// such as "1.5" or "12a" reject the file instead of reading as a quiet 0 later.
+constexpr std::string_view kSeparators = ":,;|/";
+
+bool IsBlank(char c) {
+    return c == ' ' || c == '\t';
+}
+bool IsDigit(char c) {
+    return c >= '0' && c <= '9';
+}
+bool IsKeyChar(char c) {
+    return IsDigit(c) || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
+}
+
+// One key's value as parsed: the integers in order and the separator between each
+// neighbouring pair. How entries and fields fall out of it depends on the separators a
+// reader asks with, so that split is made on demand and kept for the next read with the
+// same pair (readers walk a list with one pair, field after field).
+struct Value {
+    std::vector<std::int32_t> numbers;
+    std::string separators; // separators[i] stands between numbers[i] and numbers[i + 1]
+
+    mutable bool split = false;
+    mutable char entrySeparator = 0;
+    mutable char fieldSeparator = 0;
+    mutable std::vector<std::int32_t> fields; // 0 for a field that is not one integer
+    mutable std::vector<std::uint32_t>
+        entryStart; // entry e is fields[entryStart[e], entryStart[e + 1])
+    mutable std::uint32_t maxFields = 0;
+
+    void Split(char entrySep, char fieldSep) const {
+        if (split && entrySep == entrySeparator && fieldSep == fieldSeparator) {
+            return;
+        }
+        fields.clear();
+        entryStart.clear();
+        maxFields = 0;
+        if (!numbers.empty()) {
+            entryStart.push_back(0);
+            bool composite = false;
+            auto closeField = [&](std::size_t i) {
+                fields.push_back(composite ? 0 : numbers[i]);
+                composite = false;
+            };
+            auto closeEntry = [&] {
+                const auto count = static_cast<std::uint32_t>(fields.size()) - entryStart.back();
+                maxFields = std::max(maxFields, count);
+                entryStart.push_back(static_cast<std::uint32_t>(fields.size()));
+            };
+            for (std::size_t i = 0; i < separators.size(); ++i) {
+                const char c = separators[i];
+                if (c == entrySep) {
+                    closeField(i);
+                    closeEntry();
+                } else if (c == fieldSep) {
+                    closeField(i);
+                } else {
+                    composite = true;
+                }
+            }
+            closeField(numbers.size() - 1);
+            closeEntry();
+        }
+        split = true;
+        entrySeparator = entrySep;
+        fieldSeparator = fieldSep;
+    }
+
+    std::size_t EntryCount() const { return entryStart.empty() ? 0 : entryStart.size() - 1; }
+};
+
+short ClampShort(std::size_t n) {
+    return n > SHRT_MAX ? SHRT_MAX : static_cast<short>(n);
+}
+
+// Parses one line. Answers true for a line that holds nothing, or a key and its value
+// (then `key` is not empty); false with `reason` set for anything else.
+bool ParseLine(std::string_view line, std::string& key, Value& value, std::string& reason) {
+    if (const auto hash = line.find('#'); hash != std::string_view::npos) {
+        line = line.substr(0, hash);
+    }
+    std::size_t p = 0;
+    const std::size_t n = line.size();
+    auto skipBlanks = [&] {
+        while (p < n && IsBlank(line[p])) {
+            ++p;
+        }
+    };
+    skipBlanks();
+    if (p == n) {
+        return true;
+    }
+    const std::size_t keyBegin = p;
+    while (p < n && IsKeyChar(line[p])) {
+        ++p;
+    }
+    const std::size_t keyEnd = p;
+    skipBlanks();
+    if (keyEnd == keyBegin || p == n || line[p] != '=') {
+        reason = "expected KEY = value";
+        return false;
+    }
+    ++p;
+    key.assign(line.substr(keyBegin, keyEnd - keyBegin));
+
+    skipBlanks();
+    if (p == n) {
+        return true; // an empty value: a key with no entries
+    }
+    for (;;) {
+        const bool negative = p < n && line[p] == '-';
+        if (negative) {
+            ++p;
+        }
+        if (p == n || !IsDigit(line[p])) {
+            reason = "a field is not an integer";
+            return false;
+        }
+        std::int64_t magnitude = 0;
+        while (p < n && IsDigit(line[p])) {
+            magnitude = magnitude * 10 + (line[p] - '0');
+            if (magnitude > std::int64_t{INT32_MAX} + 1) {
+                reason = "an integer lies outside the signed 32-bit range";
+                return false;
+            }
+            ++p;
+        }
+        if (!negative && magnitude > INT32_MAX) {
+            reason = "an integer lies outside the signed 32-bit range";
+            return false;
+        }
+        value.numbers.push_back(static_cast<std::int32_t>(negative ? -magnitude : magnitude));
+        skipBlanks();
+        if (p == n) {
+            return true;
+        }
+        if (kSeparators.find(line[p]) == std::string_view::npos) {
+            reason = "a field is not an integer";
+            return false;
+        }
+        value.separators.push_back(line[p]);
+        ++p;
+        skipBlanks();
+    }
+}
+
+std::filesystem::path FindFile(const char* name, bool search) {
+    namespace fs = std::filesystem;
+    std::error_code ec;
+    auto usable = [&ec](const fs::path& candidate) { return fs::is_regular_file(candidate, ec); };
+
+    const std::string_view bare(name);
+    if (!search || bare.find('/') != std::string_view::npos) {
+        return usable(bare) ? fs::path(bare) : fs::path();
+    }
+    if (const char* dataPath = std::getenv("VENLOMER_DATA_PATH")) {
+        std::string_view dirs(dataPath);
+        while (!dirs.empty()) {
+            const auto colon = dirs.find(':');
+            const std::string_view dir = dirs.substr(0, colon);
+            dirs = colon == std::string_view::npos ? std::string_view() : dirs.substr(colon + 1);
+            // An empty element would otherwise mean the filesystem root.
+            if (!dir.empty() && usable(fs::path(dir) / bare)) {
+                return fs::path(dir) / bare;
+            }
+        }
+    }
+    if (usable(bare)) {
+        return fs::path(bare);
+    }
+#ifdef VENLOMER_INSTALL_FULL_DATADIR
+    if (usable(fs::path(VENLOMER_INSTALL_FULL_DATADIR) / bare)) {
+        return fs::path(VENLOMER_INSTALL_FULL_DATADIR) / bare;
+    }
+#endif
+    return {};
+}
+
+} // namespace
+
+struct PM_DEVKEY::Keys {
+    Port::StringBase<char> path;
+    bool valid = false;
+    std::unordered_map<std::string, Value> values;
+
+    const Value* Find(const char* key) const {
+        if (key == nullptr) {
+            return nullptr;
+        }
+        const auto it = values.find(key);
+        return it == values.end() ? nullptr : &it->second;
+    }
+
+    // Reads the whole file; any fault empties the keys again, so a rejected file never
+    // leaves half its keys behind.
+    void Read(const std::filesystem::path& file, bool report) {
+        std::ifstream in(file, std::ios::binary);
+        if (!in) {
+            if (report) {
+                Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
+                    .issueError("Key file %s cannot be read\n", path.c_str());
+            }
+            return;
+        }
+        std::unordered_map<std::string, unsigned long> firstLine;
+        std::string line;
+        std::string key;
+        std::string reason;
+        unsigned long lineNumber = 0;
+        while (std::getline(in, line)) {
+            ++lineNumber;
+            if (!line.empty() && line.back() == '\r') {
+                line.pop_back();
+            }
+            key.clear();
+            Value value;
+            if (!ParseLine(line, key, value, reason)) {
+                Reject(report, lineNumber, reason);
+                return;
+            }
+            if (key.empty()) {
+                continue;
+            }
+            const auto [seen, inserted] = firstLine.try_emplace(key, lineNumber);
+            if (!inserted) {
+                Reject(report, lineNumber,
+                       "key " + key + " is defined twice (first on line " +
+                           std::to_string(seen->second) + ")");
+                return;
+            }
+            values.emplace(std::move(key), std::move(value));
+        }
+        if (in.bad()) {
+            values.clear();
+            if (report) {
+                Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
+                    .issueError("Key file %s cannot be read\n", path.c_str());
+            }
+            return;
+        }
+        valid = true;
+    }
+
+    void Reject(bool report, unsigned long lineNumber, const std::string& reason) {
+        values.clear();
+        if (report) {
+            Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
+                .issueError("Key file %s rejected, line %lu: %s\n", path.c_str(), lineNumber,
+                            reason.c_str());
+        }
+    }
+};
+
+PM_DEVKEY::PM_DEVKEY(const char* fileName, PM_PIC* /*part*/, unsigned char required,
+                     unsigned char search, unsigned char report)
+    : m_keys(std::make_unique<Keys>()) {
+    if (fileName == nullptr || *fileName == '\0') {
+        return;
+    }
+    const std::filesystem::path file = FindFile(fileName, search != 0);
+    if (file.empty()) {
+        if (required != 0) {
+            Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
+                .issueError("Key file %s not found\n", fileName);
+        }
+        return;
+    }
+    m_keys->path = Port::StringBase<char>(file.string());
+    m_keys->Read(file, report != 0);
+}
+
+PM_DEVKEY::~PM_DEVKEY() = default;
+
+unsigned char PM_DEVKEY::get_validity() const {
+    return m_keys->valid ? 1 : 0;
+}
+
+std::pair<short, short> PM_DEVKEY::GetMaxIndex(const char* key, char entrySeparator,
+                                               char fieldSeparator) const {
+    const Value* value = m_keys->Find(key);
+    if (value == nullptr) {
+        return {0, 0};
+    }
+    value->Split(entrySeparator, fieldSeparator);
+    return {ClampShort(value->EntryCount()), ClampShort(value->maxFields)};
+}
+
+int PM_DEVKEY::GetInt32ByKey(const char* key, const char* entrySeparator, short entry,
+                             const char* fieldSeparator, short field) {
+    if (entrySeparator == nullptr || fieldSeparator == nullptr || entry < 0 || field < 0) {
+        return 0;
+    }
+    const Value* value = m_keys->Find(key);
+    if (value == nullptr) {
+        return 0;
+    }
+    value->Split(*entrySeparator, *fieldSeparator);
+    const auto e = static_cast<std::size_t>(entry);
+    if (e >= value->EntryCount()) {
+        return 0;
+    }
+    const std::size_t begin = value->entryStart[e];
+    const std::size_t end = value->entryStart[e + 1];
+    const auto f = static_cast<std::size_t>(field);
+    return f < end - begin ? value->fields[begin + f] : 0;
+}
+
+const Port::StringBase<char>& PM_DEVKEY::GetPath() const {
+    return m_keys->path;
+}
