@@ -1,0 +1,114 @@
+//===-- s/FindItr.cpp -----------------------------------------------------------===//
+#include "Port/UnitStartup.h"
+
+#include "s/FindItr.h"
+
+#include "CommonI/TRefCountHelper.h"
+#include "s/internal/Shapes.h"
+
+namespace Vn::Eng {
+
+namespace {
+const char kRevision[] = "$Revision: 1.4 $";
+const detail::Unit kUnit{"../s/FindItr", kRevision};
+} // namespace
+
+namespace FindItrImp {
+
+struct Record {
+    Record(FindItr* owner, const CommonI::RefCountPtr<VnI::IPropertyHolderItr>& itr,
+           const Port::StringBase<char>& name,
+           const CommonI::RefCountPtr<const VnI::IProperty>& property, int flags)
+        : m_flags(flags), m_propNameToMatch(name), m_propertyToMatch(property),
+          m_propHolderItr(itr), m_xIRefCount(owner) {}
+
+    int m_flags;
+    Port::StringBase<char> m_propNameToMatch;
+    CommonI::RefCountPtr<const VnI::IProperty> m_propertyToMatch;
+    CommonI::RefCountPtr<VnI::IPropertyHolderItr> m_propHolderItr;
+    CommonI::TRefCountHelper<FindItr, 0> m_xIRefCount;
+
+    bool Matches(VnI::IPropertyHolder* holder) const {
+        if (holder == nullptr) {
+            return false;
+        }
+        const CommonI::RefCountPtr<VnI::IProperty> candidate =
+            holder->GetPropertyByName(m_propNameToMatch);
+        return candidate && candidate->Equals(m_propertyToMatch, m_flags);
+    }
+
+    // Never moves past a match: it starts by testing the holder it stands on.
+    void MatchStep() {
+        VnI::IPropertyHolderItr* itr = m_propHolderItr.Get();
+        if (itr == nullptr || !m_propertyToMatch) {
+            return;
+        }
+        while (!itr->IsEnd() && !Matches(itr->CurrentItem())) {
+            itr->Next();
+        }
+    }
+};
+
+} // namespace FindItrImp
+
+CommonI::RefCountPtr<VnI::IPropertyHolderItr>
+FindItr::CreateInstance(const CommonI::RefCountPtr<VnI::IPropertyHolderItr>& itr,
+                        const Port::StringBase<char>& name,
+                        const CommonI::RefCountPtr<const VnI::IProperty>& property, int flags) {
+    return detail::AdoptCreated<VnI::IPropertyHolderItr>(new FindItr(itr, name, property, flags));
+}
+
+FindItr::FindItr(const CommonI::RefCountPtr<VnI::IPropertyHolderItr>& itr,
+                 const Port::StringBase<char>& name,
+                 const CommonI::RefCountPtr<const VnI::IProperty>& property, int flags)
+    : m_imp(new FindItrImp::Record(this, itr, name, property, flags)) {
+    First();
+}
+
+FindItr::~FindItr() {
+    delete m_imp;
+}
+
+CitI::IInterface* FindItr::GetInterface(const Port::XUID& id) {
+    return detail::AnswerCountedRecord<VnI::IPropertyHolderItr>(this, &m_imp->m_xIRefCount, id);
+}
+
+VnI::IPropertyHolder* FindItr::CurrentItem() const {
+    if (IsEnd()) {
+        return nullptr;
+    }
+    return m_imp->m_propHolderItr->CurrentItem();
+}
+
+std::int64_t FindItr::First() {
+    if (m_imp->m_propHolderItr) {
+        m_imp->m_propHolderItr->First();
+        m_imp->MatchStep();
+    }
+    return 1;
+}
+
+std::int64_t FindItr::Next() {
+    if (m_imp->m_propHolderItr && !m_imp->m_propHolderItr->IsEnd()) {
+        m_imp->m_propHolderItr->Next();
+        m_imp->MatchStep();
+    }
+    return 1;
+}
+
+bool FindItr::IsEnd() const {
+    return !m_imp->m_propHolderItr || m_imp->m_propHolderItr->IsEnd();
+}
+
+void FindItr::Dump() const {
+    using detail::AddressArg;
+    detail::DumpLine(kUnit, __LINE__, "Vn::Eng::FindItr::m_imp->m_flags = %d\n", m_imp->m_flags);
+    detail::DumpLine(kUnit, __LINE__, "Vn::Eng::FindItr::m_imp->m_propNameToMatch = %s\n",
+                     m_imp->m_propNameToMatch.c_str());
+    detail::DumpLine(kUnit, __LINE__, "Vn::Eng::FindItr::m_imp->m_propertyToMatch = %x\n",
+                     AddressArg(m_imp->m_propertyToMatch.Get()));
+    detail::DumpLine(kUnit, __LINE__, "Vn::Eng::FindItr::m_imp->m_propHolderItr = %x\n",
+                     AddressArg(m_imp->m_propHolderItr.Get()));
+}
+
+} // namespace Vn::Eng
