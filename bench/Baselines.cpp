@@ -177,6 +177,28 @@ void ListSelection(benchmark::State& state, size_t count) {
     SetItems(state, count);
 }
 
+// The documented list itself with a perfect index: every node's iterator is kept, and
+// the nodes are unlinked in a random order. No manager does less than this per item.
+void BareListUnlink(benchmark::State& state, size_t count) {
+    std::vector<int> items(count);
+    std::vector<size_t> order(count);
+    std::iota(order.begin(), order.end(), 0);
+    std::shuffle(order.begin(), order.end(), std::mt19937(1));
+    for (auto _ : state) {
+        std::list<int*> list;
+        std::vector<std::list<int*>::iterator> where;
+        where.reserve(count);
+        for (int& item : items) {
+            where.push_back(list.insert(list.end(), &item));
+        }
+        for (size_t i : order) {
+            list.erase(where[i]);
+        }
+        benchmark::DoNotOptimize(list);
+    }
+    SetItems(state, count);
+}
+
 void TileColourMap(benchmark::State& state) {
     struct Colour {
         unsigned char r, g, b;
@@ -212,6 +234,10 @@ void RegisterBaselines() {
     benchmark::RegisterBenchmark("selection/list_medium", ListSelection, sizes.medium)
         ->Iterations(1);
     benchmark::RegisterBenchmark("colour/unordered_map", TileColourMap);
+    benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small)
+        ->Iterations(sizes.tiny ? 1 : 30);
+    benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large)
+        ->Iterations(sizes.tiny ? 1 : 3);
 }
 
 } // namespace VnBench

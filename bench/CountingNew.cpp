@@ -1,7 +1,10 @@
 //===-- bench/CountingNew.cpp - a global operator new that counts bytes ---------===//
 //
 // Replacing the global allocation functions in the program replaces them for every
-// shared library it loads, so the library's own allocations are counted too.
+// shared library it loads, so the library's own allocations are counted too. The
+// nothrow forms (the property factories use them) are replaced as well: left to the
+// runtime, they could hand out memory that our operator delete then frees with the
+// wrong allocator, which the sanitizer build reports.
 //
 //===------------------------------------------------------------------------------===//
 #include "Harness.h"
@@ -32,6 +35,14 @@ void* operator new(std::size_t size) {
 void* operator new[](std::size_t size) {
     return Allocate(size);
 }
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    g_bytes.fetch_add(size, std::memory_order_relaxed);
+    return std::malloc(size == 0 ? 1 : size);
+}
+void* operator new[](std::size_t size, const std::nothrow_t&) noexcept {
+    g_bytes.fetch_add(size, std::memory_order_relaxed);
+    return std::malloc(size == 0 ? 1 : size);
+}
 void operator delete(void* p) noexcept {
     std::free(p);
 }
@@ -42,5 +53,11 @@ void operator delete(void* p, std::size_t) noexcept {
     std::free(p);
 }
 void operator delete[](void* p, std::size_t) noexcept {
+    std::free(p);
+}
+void operator delete(void* p, const std::nothrow_t&) noexcept {
+    std::free(p);
+}
+void operator delete[](void* p, const std::nothrow_t&) noexcept {
     std::free(p);
 }

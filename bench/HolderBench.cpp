@@ -172,6 +172,17 @@ void HandLoop(benchmark::State& state) {
     SetItems(state, population.holders.size());
 }
 
+// What handing out one counted reference costs by itself: the AddRef and the Release
+// that every documented GetPropertyByName makes, and a bag's shared_ptr copy makes too.
+void CountedCopy(benchmark::State& state) {
+    const RefCountPtr<VnI::IProperty> held = Int(1);
+    for (auto _ : state) {
+        RefCountPtr<VnI::IProperty> copy = held;
+        benchmark::DoNotOptimize(copy);
+    }
+    SetItems(state, 1);
+}
+
 // Builds a tree of `count` nodes below a root (siblings, or a chain), walks it, copies it
 // deeply and lets both go.
 void Tree(benchmark::State& state, size_t count, bool chain) {
@@ -210,6 +221,7 @@ void RegisterHolderBenchmarks() {
     const Sizes& sizes = GetSizes();
     const int repeat = sizes.tiny ? 1 : 3;
     benchmark::RegisterBenchmark("lookup/ours", Lookup);
+    benchmark::RegisterBenchmark("reference/counted_copy", CountedCopy);
     benchmark::RegisterBenchmark("bytes/ours", Bytes)->Iterations(1);
     benchmark::RegisterBenchmark("search_int/finditr", Search, "X", Int(500), VnI::MATCH_EXACT)
         ->Iterations(repeat);

@@ -3,6 +3,7 @@
 
 #include "VnI/IManagers.h"
 #include "VnI/ITreeNode.h"
+#include "s/ColorManager.h"
 #include "s/HighlightManager.h"
 #include "s/SelectionManager.h"
 
@@ -101,6 +102,22 @@ void HighlightThenRemove(benchmark::State& state, size_t count) {
     SetItems(state, count);
 }
 
+// A view colours every tile it draws by its type name; a known name must cost no more
+// than one lookup in a hash map. The name is copied per call, as the by-value signature
+// makes every caller do.
+void TileSiteColour(benchmark::State& state) {
+    const Port::StringBase<char> name("SLICE");
+    if (!Vn::Eng::ColorManager::GetTileSiteColor(name)) {
+        state.SkipWithError("no colour scheme loaded (VENLOMER_DATA_PATH)");
+        return;
+    }
+    for (auto _ : state) {
+        auto colour = Vn::Eng::ColorManager::GetTileSiteColor(name);
+        benchmark::DoNotOptimize(colour);
+    }
+    SetItems(state, 1);
+}
+
 } // namespace
 
 void RegisterLibraryBenchmarks() {
@@ -114,6 +131,7 @@ void RegisterLibraryBenchmarks() {
         ->Iterations(repeat * 10);
     benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large)
         ->Iterations(repeat);
+    benchmark::RegisterBenchmark("colour/GetTileSiteColor", TileSiteColour);
 }
 
 } // namespace VnBench

@@ -37,6 +37,13 @@ struct Record {
         return candidate && candidate->Equals(m_propertyToMatch, m_flags);
     }
 
+    void Rewind() {
+        if (m_propHolderItr) {
+            m_propHolderItr->First();
+            MatchStep();
+        }
+    }
+
     // Never moves past a match: it starts by testing the holder it stands on.
     void MatchStep() {
         VnI::IPropertyHolderItr* itr = m_propHolderItr.Get();
@@ -62,7 +69,7 @@ FindItr::FindItr(const CommonI::RefCountPtr<VnI::IPropertyHolderItr>& itr,
                  const Port::StringBase<char>& name,
                  const CommonI::RefCountPtr<const VnI::IProperty>& property, int flags)
     : m_imp(new FindItrImp::Record(this, itr, name, property, flags)) {
-    First();
+    m_imp->Rewind();
 }
 
 FindItr::~FindItr() {
@@ -81,10 +88,7 @@ VnI::IPropertyHolder* FindItr::CurrentItem() const {
 }
 
 std::int64_t FindItr::First() {
-    if (m_imp->m_propHolderItr) {
-        m_imp->m_propHolderItr->First();
-        m_imp->MatchStep();
-    }
+    m_imp->Rewind();
     return 1;
 }
 

@@ -6,8 +6,10 @@
 #include "s/DeviceResourceItr.h"
 #include "s/internal/Shapes.h"
 
-#include <unordered_map>
-#include <vector>
+#include "s/internal/PointerIndex.h"
+
+#include <deque>
+#include <memory>
 
 namespace Vn::Eng {
 
@@ -31,11 +33,12 @@ public:
     std::int64_t RemoveAll() override { return m_owner->RemoveAll(); }
 };
 
-// The entries of one resource, oldest first from `head` on. Entries are only ever
-// appended at the list's end and removed oldest first, so a queue keeps them in order.
+// The entries of one resource. Entries are only ever appended at the list's end and
+// removed oldest first, so a queue keeps them in order; the oldest sits in the index
+// itself, and only a resource highlighted more than once needs the queue.
 struct Entries {
-    std::vector<List::iterator> positions;
-    size_t head = 0;
+    List::iterator oldest;
+    std::unique_ptr<std::deque<List::iterator>> later;
 };
 
 struct Record {
@@ -43,7 +46,7 @@ struct Record {
 
     List m_highlightedItems;
     HighlightManager_IHighlightManager m_interface;
-    std::unordered_map<VnI::IDeviceResource*, Entries> m_index;
+    detail::PointerIndex<VnI::IDeviceResource, Entries> m_index;
 };
 
 } // namespace HighlightManagerImp
@@ -70,26 +73,30 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     }
     resource->SetHighlighted(true);
     auto& list = m_imp->m_highlightedItems;
-    m_imp->m_index[resource].positions.push_back(list.insert(list.end(), resource));
+    const HighlightManagerImp::List::iterator at = list.insert(list.end(), resource);
+    if (HighlightManagerImp::Entries* entries = m_imp->m_index.Find(resource)) {
+        if (!entries->later) {
+            entries->later = std::make_unique<std::deque<HighlightManagerImp::List::iterator>>();
+        }
+        entries->later->push_back(at);
+    } else {
+        m_imp->m_index.FindOrAdd(resource).oldest = at;
+    }
     return 1;
 }
 
 std::int64_t HighlightManager::RemoveHighlightedItem(VnI::IDeviceResource* resource) {
-    const auto found = m_imp->m_index.find(resource);
-    if (found == m_imp->m_index.end()) {
+    HighlightManagerImp::Entries* entries = resource ? m_imp->m_index.Find(resource) : nullptr;
+    if (entries == nullptr) {
         return 1;
     }
-    HighlightManagerImp::Entries& entries = found->second;
     resource->SetHighlighted(false);
-    m_imp->m_highlightedItems.erase(entries.positions[entries.head++]);
-    if (entries.head == entries.positions.size()) {
-        m_imp->m_index.erase(found);
-    } else if (entries.head > 16 && entries.head * 2 > entries.positions.size()) {
-        // Drop the consumed front so a resource highlighted many times stays compact.
-        entries.positions.erase(entries.positions.begin(),
-                                entries.positions.begin() +
-                                    static_cast<std::ptrdiff_t>(entries.head));
-        entries.head = 0;
+    m_imp->m_highlightedItems.erase(entries->oldest);
+    if (entries->later && !entries->later->empty()) {
+        entries->oldest = entries->later->front();
+        entries->later->pop_front();
+    } else {
+        m_imp->m_index.Erase(resource);
     }
     return 1;
 }
@@ -99,7 +106,7 @@ std::int64_t HighlightManager::RemoveAll() {
         resource->SetHighlighted(false);
     }
     m_imp->m_highlightedItems.clear();
-    m_imp->m_index.clear();
+    m_imp->m_index.Clear();
     return 1;
 }
 

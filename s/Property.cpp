@@ -9,6 +9,7 @@
 
 #include <climits>
 #include <cmath>
+#include <optional>
 #include <string>
 
 namespace Vn::Eng {
@@ -59,27 +60,37 @@ template <class T> bool NumberMatches(T mine, T theirs, int flags) {
 /// The regular-expression test: the pattern must match at the very start of the value.
 bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<char>& pattern,
                    int flags) {
-    const bool ignoreCase = (flags & VnI::MATCH_IGNORE_CASE) != 0;
-    const bool substring = (flags & VnI::MATCH_SUBSTRING) != 0;
-
-    Port::StringBase<char> text = value;
-    // Case is ignored by the expression itself: upper-casing the pattern would turn
-    // escapes such as \d, \w and \s into their negations.
-    std::string expression;
-    expression.reserve(pattern.GetLength() + 8);
-    if (ignoreCase) {
-        text.MakeUpper();
-        expression += "(?i)";
+    // A search compares a million values with one pattern: keep the last expression
+    // built, so each comparison costs a text compare and one anchored match.
+    struct LastExpression {
+        std::string pattern;
+        int flags = -1;
+        std::optional<Port_Regexp> compiled;
+    };
+    thread_local LastExpression last;
+    const int shape = flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
+    if (!last.compiled || last.flags != shape || last.pattern != pattern.view()) {
+        // Case is ignored by the expression itself: upper-casing the pattern would turn
+        // escapes such as \d, \w and \s into their negations. With the expression
+        // ignoring case, upper-casing the value as well would change no outcome.
+        std::string expression;
+        expression.reserve(pattern.GetLength() + 8);
+        if ((shape & VnI::MATCH_IGNORE_CASE) != 0) {
+            expression += "(?i)";
+        }
+        if ((shape & VnI::MATCH_SUBSTRING) != 0) {
+            expression += ".*";
+        }
+        expression += pattern.view();
+        if ((shape & VnI::MATCH_SUBSTRING) != 0) {
+            expression += ".*";
+        }
+        last.compiled.emplace(std::string_view(expression));
+        last.pattern.assign(pattern.view());
+        last.flags = shape;
     }
-    if (substring) {
-        expression += ".*";
-    }
-    expression += pattern.view();
-    if (substring) {
-        expression += ".*";
-    }
-    const Port_Range range = text.GetRangeOfMatch(Port_Regexp(std::string_view(expression)));
-    return range.first == 0 && range.second >= range.first;
+    // The value matches when a match of the expression starts at its first byte.
+    return last.compiled->MatchesAtStart(value.view());
 }
 
 } // namespace

@@ -5,6 +5,7 @@
 
 #include "s/PropertyItr.h"
 #include "s/internal/Shapes.h"
+#include "s/internal/TreeLinks.h"
 
 #include <algorithm>
 #include <cstdint>

@@ -24,13 +24,20 @@
 #include "VnI/IPropertyHolder.h"
 #include "VnI/ITreeNode.h"
 #include "s/Export.h"
-#include "s/internal/TreeLinks.h"
 
 namespace Vn::Eng {
+
+class PropertyHolder;
+class TreeNode;
 
 namespace PropertyHolderImp {
 struct Record;
 }
+
+namespace detail {
+// Where the nodes that show a holder are listed, so a dying holder can tell them.
+TreeNode*& NodesShowing(PropertyHolder& holder);
+} // namespace detail
 
 class VENLOMER_API PropertyHolder : public VnI::IPropertyHolder {
 public:

@@ -5,13 +5,12 @@
 
 #include "s/PropertyName.h"
 #include "s/PropertyNameItr.h"
+#include "s/internal/NameIndex.h"
 #include "s/internal/Shapes.h"
 
 #include <cstdint>
-#include <functional>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <vector>
 
 namespace Vn::Eng {
@@ -20,14 +19,6 @@ namespace {
 const char kRevision[] = "$Revision: 1.7 $";
 const detail::Unit kUnit{"../s/PropertyNameList", kRevision};
 
-/// Hashes texts by their bytes whatever their type, so that a lookup by a caller's
-/// Port::StringBase builds no std::string: a search asks once per holder.
-struct TextHash {
-    using is_transparent = void;
-    std::size_t operator()(std::string_view text) const noexcept {
-        return std::hash<std::string_view>{}(text);
-    }
-};
 } // namespace
 
 namespace PropertyNameListImp {
@@ -66,7 +57,7 @@ struct Record {
 
     PropertyNameList_IPropertyNameList m_xIPropertyNameList;
     PropertyNameItr::Names names;
-    std::unordered_map<std::string, std::uint32_t, TextHash, std::equal_to<>> m_nameIndex;
+    detail::NameIndex m_nameIndex;
     std::int32_t m_numVisibleNames = 0;
 };
 
@@ -104,8 +95,7 @@ CommonI::RefCountPtr<VnI::IPropertyNameItr> PropertyNameList::GetNameItr() const
 }
 
 int PropertyNameList::Contains(const Port::StringBase<char>& name) const {
-    const auto found = m_imp->m_nameIndex.find(name.view());
-    return found == m_imp->m_nameIndex.end() ? -1 : static_cast<int>(found->second);
+    return m_imp->m_nameIndex.Find(name.view());
 }
 
 int PropertyNameList::AddName(const Port::StringBase<char>& name, VnI::PropertyType type,
@@ -123,9 +113,8 @@ int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::Prope
     if (!created) {
         return -1;
     }
-    const auto position = static_cast<std::uint32_t>(m_imp->names.size());
+    const std::uint32_t position = m_imp->m_nameIndex.Append(name.view());
     m_imp->names.push_back(std::move(created));
-    m_imp->m_nameIndex.emplace(name.str(), position);
     if (visible) {
         ++m_imp->m_numVisibleNames;
     }
@@ -157,7 +146,7 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
 
 std::int64_t PropertyNameList::ClearList() {
     m_imp->names.clear();
-    m_imp->m_nameIndex.clear();
+    m_imp->m_nameIndex.Clear();
     m_imp->m_numVisibleNames = 0;
     return 1;
 }

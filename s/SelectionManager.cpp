@@ -7,9 +7,10 @@
 #include "s/PropertyHolderItr.h"
 #include "s/internal/Shapes.h"
 
-#include <algorithm>
+#include "s/internal/PointerIndex.h"
+
 #include <deque>
-#include <unordered_map>
+#include <memory>
 #include <vector>
 
 namespace Vn::Eng {
@@ -38,13 +39,41 @@ public:
     std::int64_t RemoveAll() override { return m_owner->RemoveAll(); }
 };
 
-// Where one holder stands in the lists. A holder normally stands once in one category
-// and once overall; it can stand more often only when a host cleared its flag by hand
-// and selected it again, so small vectors serve.
+// One selection of a holder: its node in its category list and in the overall list.
+// A removal takes the category node and the oldest overall node, so the two can be
+// gone at different times.
+struct Entry {
+    int category = -1;
+    List::iterator inCategory{};
+    List::iterator inAll{};
+    bool hasCategory = false;
+    bool hasAll = false;
+    bool Used() const { return hasCategory || hasAll; }
+};
+
+// Where one holder stands. A holder is normally selected once, and that entry lives in
+// the index itself; it can stand more often only when a host cleared its flag by hand
+// and selected it again, and only then is the spill vector allocated.
 struct Positions {
-    std::vector<std::pair<int, List::iterator>> inCategory; // in order of selection
-    std::vector<List::iterator> inAll;                      // oldest first, from allHead on
-    size_t allHead = 0;
+    Entry first;
+    std::unique_ptr<std::vector<Entry>> more; // later selections, oldest first
+
+    template <class F> void ForEach(F&& f) {
+        f(first);
+        if (more) {
+            for (Entry& e : *more) {
+                f(e);
+            }
+        }
+    }
+    // Keeps the oldest entry still in use in `first`; false when none is left.
+    bool Normalize() {
+        while (!first.Used() && more && !more->empty()) {
+            first = more->front();
+            more->erase(more->begin());
+        }
+        return first.Used();
+    }
 };
 
 struct Record {
@@ -55,7 +84,7 @@ struct Record {
     std::deque<List> m_selectedItems;
     List m_allSelectedItems;
     SelectionManager_ISelectionManager m_interface;
-    std::unordered_map<VnI::IPropertyHolder*, Positions> m_index;
+    detail::PointerIndex<VnI::IPropertyHolder, Positions> m_index;
 
     // Files holder under its type unless it is null, refused or already flagged.
     // True when it was selected now (so its subtree is to be visited).
@@ -84,9 +113,17 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
     }
     holder->SetSelected(true);
     List& category = m_selectedItems[static_cast<size_t>(type)];
-    Positions& at = m_index[holder];
-    at.inCategory.emplace_back(type, category.insert(category.end(), holder));
-    at.inAll.push_back(m_allSelectedItems.insert(m_allSelectedItems.end(), holder));
+    const Entry entry{type, category.insert(category.end(), holder),
+                      m_allSelectedItems.insert(m_allSelectedItems.end(), holder), true, true};
+    Positions& at = m_index.FindOrAdd(holder);
+    if (!at.first.Used()) {
+        at.first = entry;
+    } else {
+        if (!at.more) {
+            at.more = std::make_unique<std::vector<Entry>>();
+        }
+        at.more->push_back(entry);
+    }
     return true;
 }
 
@@ -161,32 +198,33 @@ std::int64_t SelectionManager::RemoveSelectedItem(VnI::IPropertyHolder* holder, 
         return 1;
     }
     const int type = holder->GetType();
-    auto found = m_imp->m_index.find(holder);
-    const bool listed =
-        type >= 0 && type < GetNumCategories() && found != m_imp->m_index.end() &&
-        std::any_of(found->second.inCategory.begin(), found->second.inCategory.end(),
-                    [type](const auto& entry) { return entry.first == type; });
+    SelectionManagerImp::Positions* at = m_imp->m_index.Find(holder);
+    bool listed = false;
+    if (at != nullptr && type >= 0 && type < GetNumCategories()) {
+        at->ForEach([&](const SelectionManagerImp::Entry& e) {
+            listed = listed || (e.hasCategory && e.category == type);
+        });
+    }
     if (!listed) {
         Port_MsgManData::debugStub("Trying to remove an item that doesn't exist");
     } else {
         holder->SetSelected(false);
-        SelectionManagerImp::Positions& at = found->second;
         SelectionManagerImp::List& category = m_imp->m_selectedItems[static_cast<size_t>(type)];
-        auto& entries = at.inCategory;
-        entries.erase(std::remove_if(entries.begin(), entries.end(),
-                                     [&](const auto& entry) {
-                                         if (entry.first != type) {
-                                             return false;
-                                         }
-                                         category.erase(entry.second);
-                                         return true;
-                                     }),
-                      entries.end());
-        if (at.allHead < at.inAll.size()) {
-            m_imp->m_allSelectedItems.erase(at.inAll[at.allHead++]);
-        }
-        if (entries.empty() && at.allHead == at.inAll.size()) {
-            m_imp->m_index.erase(found);
+        // Out of its category wholly, out of the overall list once (its oldest place).
+        bool allTaken = false;
+        at->ForEach([&](SelectionManagerImp::Entry& e) {
+            if (e.hasCategory && e.category == type) {
+                category.erase(e.inCategory);
+                e.hasCategory = false;
+            }
+            if (!allTaken && e.hasAll) {
+                m_imp->m_allSelectedItems.erase(e.inAll);
+                e.hasAll = false;
+                allTaken = true;
+            }
+        });
+        if (!at->Normalize()) {
+            m_imp->m_index.Erase(holder);
         }
     }
     if (withChildren) {
@@ -211,7 +249,7 @@ std::int64_t SelectionManager::RemoveAll() {
         category.clear();
     }
     m_imp->m_allSelectedItems.clear();
-    m_imp->m_index.clear();
+    m_imp->m_index.Clear();
     return 1;
 }
 

@@ -50,3 +50,23 @@ TEST(PortRegexp, CopiesShareTheCompiledPatternAndBothMatch) {
     }
     EXPECT_TRUE(a.Find("x9", nullptr, nullptr));
 }
+
+TEST(PortRegexp, MatchesAtStartAgreesWithTheLeftmostMatch) {
+    for (const char* pattern : {"Ban", "ank", ".*ank.*", "x*", "[0-9]+", "(?i)bank", "("}) {
+        Port_Regexp re(pattern);
+        for (const char* text : {"Bank12", "", "12Bank", "bank"}) {
+            unsigned int start = 1;
+            const bool leftmostAtZero = re.Find(text, &start, nullptr) && start == 0;
+            EXPECT_EQ(re.MatchesAtStart(text), leftmostAtZero) << pattern << " on " << text;
+        }
+    }
+}
+
+TEST(PortRegexp, EveryByteIsOneCharacter) {
+    // Narrow 8-bit text: a byte that is not valid UTF-8 is still one character for `.`.
+    EXPECT_TRUE(Port_Regexp("^a.b$").MatchesAtStart("a\xE9"
+                                                    "b"));
+    EXPECT_TRUE(Port_Regexp("^a..b$").MatchesAtStart("a\xC3\xA9"
+                                                     "b"));
+    EXPECT_TRUE(Port_Regexp("(?i)caf\xC9").MatchesAtStart("CAF\xE9"));
+}

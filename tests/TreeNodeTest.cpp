@@ -10,6 +10,7 @@
 
 #include <memory>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 using CommonI::RefCountPtr;
@@ -339,4 +340,96 @@ TEST(TreeCopy, GroupNodesStayGroupNodesWithTheirNames) {
     EXPECT_EQ(NameOf(below[0]), "IO");
     EXPECT_EQ(NameOf(below[1]), "Pins");
     EXPECT_EQ(below[0]->GetParent().Get(), top[1]);
+}
+
+TEST(TreeInterfaces, NodesAnswerTheirInterfaceObjectAndCounter) {
+    auto plain = Node();
+    auto group = TreeGroupNode::CreateInstance("g", nullptr);
+    for (ITreeNode* node : {plain.Get(), group.Get()}) {
+        TreeNode* owner = TreeNode::FromInterface(node);
+        CitI::IInterface* counter = node->GetInterface(CommonI::IID_IRefCount);
+        ASSERT_NE(counter, nullptr);
+        EXPECT_NE(counter, static_cast<CitI::IInterface*>(node));
+        for (CitI::IInterface* from : {static_cast<CitI::IInterface*>(node), counter}) {
+            EXPECT_EQ(from->GetInterface(VnI::IID_ITreeNode), node);
+            EXPECT_EQ(from->GetInterface(CitI::IID_IInterface), node);
+            EXPECT_EQ(from->GetInterface(CommonI::IID_IRefCount), counter);
+            EXPECT_EQ(from->GetInterface(VnI::IID_ITreeNodeItr), nullptr);
+            EXPECT_EQ(from->GetInterface(VnI::IID_IPropertyHolder), nullptr);
+        }
+        EXPECT_EQ(owner->GetInterface(VnI::IID_ITreeNode), node);
+        EXPECT_EQ(owner->GetInterface(CommonI::IID_IRefCount), counter);
+    }
+}
+
+TEST(TreeInterfaces, IteratorsAnswerNoBaseInterface) {
+    auto parent = Node();
+    auto it = parent->GetChildren();
+    CitI::IInterface* counter = it->GetInterface(CommonI::IID_IRefCount);
+    ASSERT_NE(counter, nullptr);
+    for (CitI::IInterface* from : {static_cast<CitI::IInterface*>(it.Get()), counter}) {
+        EXPECT_EQ(from->GetInterface(VnI::IID_ITreeNodeItr), it.Get());
+        EXPECT_EQ(from->GetInterface(CitI::IID_IInterface), nullptr);
+        EXPECT_EQ(from->GetInterface(CommonI::IID_IRefCount), counter);
+        EXPECT_EQ(from->GetInterface(VnI::IID_ITreeNode), nullptr);
+    }
+    EXPECT_EQ(CountOf(it.Get()), 1);
+}
+
+TEST(TreeInterfaces, TheModelAnswersItsInterfaceObjectAndCounter) {
+    auto model = Vn::Eng::TreeDataModel::CreateInstance(Node());
+    CitI::IInterface* counter = model->GetInterface(CommonI::IID_IRefCount);
+    ASSERT_NE(counter, nullptr);
+    for (CitI::IInterface* from : {static_cast<CitI::IInterface*>(model.Get()), counter}) {
+        EXPECT_EQ(from->GetInterface(VnI::IID_ITreeModel), model.Get());
+        EXPECT_EQ(from->GetInterface(CitI::IID_IInterface), model.Get());
+        EXPECT_EQ(from->GetInterface(CommonI::IID_IRefCount), counter);
+        EXPECT_EQ(from->GetInterface(VnI::IID_ITreeNode), nullptr);
+    }
+    EXPECT_EQ(CountOf(model.Get()), 1);
+}
+
+TEST(TreeInterfaces, SlotOrderIsTheContract) {
+    using VnTest::SlotOf;
+    EXPECT_EQ(SlotOf(&ITreeNode::GetInterface), 0);
+    EXPECT_EQ(SlotOf(&ITreeNode::AddChild), 3);
+    EXPECT_EQ(SlotOf(&ITreeNode::InsertChild), 4);
+    EXPECT_EQ(SlotOf(&ITreeNode::GetDataRef), 5);
+    EXPECT_EQ(SlotOf(&ITreeNode::GetChildren), 6);
+    EXPECT_EQ(SlotOf(&ITreeNode::RemoveChild), 7);
+    EXPECT_EQ(SlotOf(&ITreeNode::GetParent), 8);
+    EXPECT_EQ(SlotOf(&ITreeNode::HasChildren), 9);
+    EXPECT_EQ(SlotOf(&ITreeNodeItr::CurrentItem), 3);
+    EXPECT_EQ(SlotOf(&ITreeNodeItr::First), 4);
+    EXPECT_EQ(SlotOf(&ITreeNodeItr::Next), 5);
+    EXPECT_EQ(SlotOf(&ITreeNodeItr::IsEnd), 6);
+    EXPECT_EQ(SlotOf(&VnI::ITreeModel::GetRootNode), 3);
+    // The public classes add nothing virtual but their destructors.
+    EXPECT_EQ(SlotOf(&TreeNode::AddChild), -1);
+    EXPECT_EQ(SlotOf(&Vn::Eng::TreeNodeItr::Next), -1);
+    EXPECT_EQ(SlotOf(&Vn::Eng::TreeDataModel::GetRootNode), -1);
+    EXPECT_TRUE(std::has_virtual_destructor_v<TreeNode>);
+    EXPECT_TRUE(std::has_virtual_destructor_v<Vn::Eng::TreeNodeItr>);
+    EXPECT_TRUE(std::has_virtual_destructor_v<Vn::Eng::TreeDataModel>);
+}
+
+TEST(TreeInterfaces, DumpIssuesItsEightLinesFromItsUnit) {
+    VnTest::MessageCapture capture;
+    auto node = Node();
+    TreeNode::FromInterface(node.Get())->Dump();
+    ASSERT_EQ(capture.Messages().size(), 8u);
+    const char* members[] = {"m_ITreeNode",   "visible",      "m_selected",   "m_prevSibling",
+                             "m_nextSibling", "m_firshChild", "m_parentNode", "m_propHolder"};
+    for (size_t i = 0; i < 8; ++i) {
+        const Port::Message& m = capture.Messages()[i];
+        EXPECT_EQ(m.severity, Port::Severity::Status);
+        EXPECT_EQ(m.domain, "Venlomer");
+        EXPECT_EQ(m.unit, "../s/TreeNode");
+        EXPECT_EQ(m.revision, "$Revision: 1.5 $");
+        EXPECT_EQ(m.line, 169 + static_cast<int>(i));
+        const std::string prefix = std::string("Vn::Eng::TreeNode::m_imp->") + members[i] + " = ";
+        EXPECT_EQ(m.text.rfind(prefix, 0), 0u) << m.text;
+    }
+    EXPECT_EQ(capture.Messages()[1].text, "Vn::Eng::TreeNode::m_imp->visible = 1\n");
+    EXPECT_EQ(capture.Messages()[2].text, "Vn::Eng::TreeNode::m_imp->m_selected = 0\n");
 }

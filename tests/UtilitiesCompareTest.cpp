@@ -23,6 +23,7 @@ std::vector<std::string> Sorted(std::vector<std::string> texts,
     std::vector<StringBase<char>> names(texts.begin(), texts.end());
     std::stable_sort(names.begin(), names.end(), less);
     std::vector<std::string> out;
+    out.reserve(names.size());
     for (const auto& name : names) {
         out.push_back(name.str());
     }

@@ -30,9 +30,8 @@ std::string UnitOf(const char* path) {
 
 namespace Nmod_Exception {
 
-Base::Base(std::string message, std::source_location where)
-    : m_message(std::move(message)), m_unit(UnitOf(where.file_name())),
-      m_line(static_cast<int>(where.line())) {}
+Base::Base(std::string message, const char* file, int line)
+    : m_message(std::move(message)), m_unit(UnitOf(file)), m_line(line) {}
 
 Base::~Base() = default;
 
@@ -50,8 +49,14 @@ void Base::Report() const {
     }
 }
 
-Database::Database(std::string message, int code, std::source_location where)
-    : Base(std::move(message), where), m_code(code) {}
+Database::Database(std::string message, int code, const char* file, int line)
+    : Base(std::move(message), file, line), m_code(code) {}
+
+Format::Format(std::string message, const char* file, int line)
+    : Base(std::move(message), file, line) {}
+
+Usage::Usage(std::string message, const char* file, int line)
+    : Base(std::move(message), file, line) {}
 
 Database::~Database() = default;
 Format::~Format() = default;

@@ -16,6 +16,8 @@ RE2::Options QuietOptions() {
     RE2::Options options;
     // An invalid pattern is an ordinary outcome of a search box, not something to log.
     options.set_log_errors(false);
+    // Texts are narrow 8-bit text, not UTF-8: `.` must match any single byte.
+    options.set_encoding(RE2::Options::EncodingLatin1);
     return options;
 }
 
@@ -107,4 +109,12 @@ bool Port_Regexp::Find(std::string_view text, unsigned int* start, unsigned int*
         *length = static_cast<unsigned int>(match.size());
     }
     return true;
+}
+
+bool Port_Regexp::MatchesAtStart(std::string_view text) const {
+    if (!IsValid()) {
+        return false;
+    }
+    re2::StringPiece input(text.data(), text.size());
+    return m_compiled->re.Match(input, 0, input.size(), RE2::ANCHOR_START, nullptr, 0);
 }

@@ -23,15 +23,15 @@
 #include "Port/Export.h"
 
 #include <exception>
-#include <source_location>
 #include <string>
 
 namespace Nmod_Exception {
 
 class VN_VISIBLE Base : public std::exception {
 public:
-    explicit Base(std::string message,
-                  std::source_location where = std::source_location::current());
+    /// `file` and `line` default to the place of the throw.
+    explicit Base(std::string message, const char* file = __builtin_FILE(),
+                  int line = __builtin_LINE());
     ~Base() override;
     Base(const Base&) = default;
     Base& operator=(const Base&) = default;
@@ -57,8 +57,8 @@ private:
 /// a missing folder, a damaged file). GetCode() is the engine's primary result code.
 class VN_VISIBLE Database : public Base {
 public:
-    Database(std::string message, int code,
-             std::source_location where = std::source_location::current());
+    Database(std::string message, int code, const char* file = __builtin_FILE(),
+             int line = __builtin_LINE());
     ~Database() override;
     Database(const Database&) = default;
     Database& operator=(const Database&) = default;
@@ -73,7 +73,8 @@ private:
 /// record, another format version, or records that contradict each other.
 class VN_VISIBLE Format : public Base {
 public:
-    using Base::Base;
+    explicit Format(std::string message, const char* file = __builtin_FILE(),
+                    int line = __builtin_LINE());
     ~Format() override;
     Format(const Format&) = default;
     Format& operator=(const Format&) = default;
@@ -83,7 +84,8 @@ public:
 /// that was read, a second root block, a name given as a null pointer.
 class VN_VISIBLE Usage : public Base {
 public:
-    using Base::Base;
+    explicit Usage(std::string message, const char* file = __builtin_FILE(),
+                   int line = __builtin_LINE());
     ~Usage() override;
     Usage(const Usage&) = default;
     Usage& operator=(const Usage&) = default;

@@ -1,7 +1,8 @@
 //===-- Port/Regexp.h - linear-time regular expressions -------------------------===//
 //
 // \file
-// Port_Regexp compiles a pattern in RE2 syntax (which includes `.` and `*`). Matching
+// Port_Regexp compiles a pattern in RE2 syntax (which includes `.` and `*`), reading
+// texts as narrow 8-bit text: every byte is one character (Latin-1). Matching
 // runs in time linear in the text, so a pattern typed into a search box can never hang
 // the editor. An invalid pattern matches nothing and never throws.
 //
@@ -35,6 +36,9 @@ public:
     bool IsValid() const;
     /// Leftmost match in text: true with its start and length, false when none.
     bool Find(std::string_view text, unsigned int* start, unsigned int* length) const;
+    /// Whether a match starts at the first byte (the leftmost match then starts there too).
+    /// Cheaper than Find: no scan along the text and no match bounds.
+    bool MatchesAtStart(std::string_view text) const;
 
     struct Compiled;
 

@@ -1,0 +1,98 @@
+// A search compares one wanted value with the property of every holder and looks the
+// property's name up in every holder's schema: over a million holders, one allocation per
+// comparison is a million allocations. These tests count them.
+#include "s/PropertyFactory.h"
+#include "s/PropertyNameList.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <new>
+
+namespace {
+std::atomic<long> g_allocations{0};
+} // namespace
+
+void* operator new(std::size_t size) {
+    ++g_allocations;
+    if (void* p = std::malloc(size == 0 ? 1 : size)) {
+        return p;
+    }
+    throw std::bad_alloc();
+}
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    ++g_allocations;
+    return std::malloc(size == 0 ? 1 : size);
+}
+void operator delete(void* p) noexcept {
+    std::free(p);
+}
+void operator delete(void* p, std::size_t) noexcept {
+    std::free(p);
+}
+void operator delete(void* p, const std::nothrow_t&) noexcept {
+    std::free(p);
+}
+
+using CommonI::RefCountPtr;
+using Vn::Eng::PropertyFactory;
+using VnI::IProperty;
+
+namespace {
+
+// Longer than any small-string buffer, so that a copy would have to allocate.
+const char kLong[] = "a text well beyond every small-string buffer of the library";
+
+RefCountPtr<const IProperty> Adopt(IProperty* raw) {
+    return RefCountPtr<const IProperty>::Adopt(raw);
+}
+
+template <class F> long AllocationsOf(F&& run) {
+    const long before = g_allocations.load();
+    run();
+    return g_allocations.load() - before;
+}
+
+} // namespace
+
+TEST(HotPathAllocations, PlainComparisonsAllocateNothing) {
+    const auto i1 = Adopt(PropertyFactory::CreateIntProperty(100, true));
+    const auto i2 = Adopt(PropertyFactory::CreateIntProperty(96, true));
+    const auto d1 = Adopt(PropertyFactory::CreateDoubleProperty(1.5, true));
+    const auto d2 = Adopt(PropertyFactory::CreateDoubleProperty(1.5, true));
+    const auto s1 = Adopt(PropertyFactory::CreateStringProperty(kLong, true));
+    const auto s2 = Adopt(PropertyFactory::CreateStringProperty(kLong, true));
+    std::vector<Port::StringBase<char>> values{kLong, "B"};
+    const auto e = Adopt(PropertyFactory::CreateEnumProperty(values, "", true));
+
+    // The counter sees the allocations of the library: copying a long text is one.
+    ASSERT_GT(AllocationsOf([&] { (void)s1->GetStringProperty(); }), 0);
+
+    bool all = true;
+    EXPECT_EQ(AllocationsOf([&] {
+                  all = all && !i1->Equals(i2, 0) && i1->Equals(i2, VnI::MATCH_WITHIN_5_PERCENT);
+                  all = all && d1->Equals(d2, VnI::MATCH_EXACT);
+                  all = all && s1->Equals(s2, 0) && s1->Equals(s2, VnI::MATCH_SUBSTRING);
+                  all = all && s1->Equals(s2, VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
+                  all = all && e->Equals(s1, 0) && !s1->LessThan(s2, 0);
+              }),
+              0);
+    EXPECT_TRUE(all);
+}
+
+TEST(HotPathAllocations, NameLookupBuildsNoString) {
+    Vn::Eng::PropertyNameList list;
+    list.AddName(kLong, VnI::STRING_TYPE, true);
+    const Port::StringBase<char> wanted(kLong);
+    const Port::StringBase<char> absent("another text well beyond every small-string buffer");
+    int found = 0;
+    int missing = 0;
+    EXPECT_EQ(AllocationsOf([&] {
+                  found = list.Contains(wanted);
+                  missing = list.Contains(absent);
+              }),
+              0);
+    EXPECT_EQ(found, 0);
+    EXPECT_EQ(missing, -1);
+}
