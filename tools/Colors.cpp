@@ -8,26 +8,20 @@
 #include "Commands.h"
 #include "Svg.h"
 
+#include "devdata/PM_DEVKEY.h"
+#include "s/ColorManager.h"
+#include "s/internal/ColorManagerImp.h"
+
 #include <algorithm>
 #include <cstdio>
 #include <string>
 #include <vector>
-
-#if __has_include("s/ColorManager.h") && __has_include("s/internal/ColorManagerImp.h") &&          \
-                                                       __has_include("devdata/PM_DEVKEY.h")
-#define VENLOMER_TOOL_COLORS 1
-#include "devdata/PM_DEVKEY.h"
-#include "s/ColorManager.h"
-#include "s/internal/ColorManagerImp.h"
-#endif
 
 namespace VnTool {
 
 namespace {
 
 const char kCommand[] = "colors";
-
-#if defined(VENLOMER_TOOL_COLORS)
 
 using Color = Vn::Eng::ColorManager::Color;
 
@@ -172,14 +166,6 @@ int Run(const ParsedArgs& args) {
     }
     return kExitOk;
 }
-
-#else
-
-int Run(const ParsedArgs& /*args*/) {
-    return NotAvailable(kCommand, "colour manager");
-}
-
-#endif
 
 } // namespace
 

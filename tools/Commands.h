@@ -28,7 +28,4 @@ int Refused(const std::string& command, const std::string& why);
 /// then in share/venlomer beside the program's bin folder. Empty when not found.
 std::string FindDataFile(const std::string& name);
 
-/// The answer of a subcommand whose library part this build does not contain.
-int NotAvailable(const std::string& command, const std::string& what);
-
 } // namespace VnTool

@@ -19,10 +19,6 @@ int Refused(const std::string& command, const std::string& why) {
     return kExitRefused;
 }
 
-int NotAvailable(const std::string& command, const std::string& what) {
-    return Refused(command, "not available in this build: the library has no " + what + " yet");
-}
-
 std::string FindDataFile(const std::string& name) {
     namespace fs = std::filesystem;
     std::error_code ec;

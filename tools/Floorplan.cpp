@@ -11,19 +11,6 @@
 #include "Commands.h"
 #include "Svg.h"
 
-#include <charconv>
-#include <cstdio>
-#include <cstdlib>
-#include <filesystem>
-#include <string>
-#include <vector>
-
-#if __has_include("s/DeviceResource.h") &&                                                         \
-                  __has_include("s/TreeNode.h") &&                                                 \
-                                __has_include("s/TreeDataModel.h") &&                              \
-                                              __has_include("s/FindItr.h") &&                      \
-                                                            __has_include("s/ColorManager.h")
-#define VENLOMER_TOOL_FLOORPLAN 1
 #include "CommonI/RefCountPtr.h"
 #include "VnI/IDeviceResource.h"
 #include "VnI/ITreeNode.h"
@@ -39,9 +26,14 @@
 #include "s/TreeDataModel.h"
 #include "s/TreeNode.h"
 
+#include <charconv>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
 #include <list>
 #include <memory>
-#endif
+#include <string>
+#include <vector>
 
 namespace VnTool {
 
@@ -58,10 +50,16 @@ struct FlagName {
     int bit;
 };
 
-// The compare flags by the names the user types; values are the library's published bits.
+// The compare flags by the names the user types.
 const FlagName kFlagNames[] = {
-    {"exact", 0x01}, {"ignore-case", 0x02}, {"substring", 0x04}, {"within-5-percent", 0x08},
-    {"less", 0x10},  {"greater", 0x20},     {"any", 0x40},       {"regexp", 0x80},
+    {"exact", VnI::MATCH_EXACT},
+    {"ignore-case", VnI::MATCH_IGNORE_CASE},
+    {"substring", VnI::MATCH_SUBSTRING},
+    {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
+    {"less", VnI::MATCH_LESS},
+    {"greater", VnI::MATCH_GREATER},
+    {"any", VnI::MATCH_ANY},
+    {"regexp", VnI::MATCH_REGEXP},
 };
 
 bool ParseFlags(const std::string& list, int& flags, std::string& error) {
@@ -91,7 +89,7 @@ bool ParseFlags(const std::string& list, int& flags, std::string& error) {
     return true;
 }
 
-[[maybe_unused]] std::string FlagsText(int flags) {
+std::string FlagsText(int flags) {
     std::string text;
     for (const auto& flag : kFlagNames) {
         if ((flags & flag.bit) != 0) {
@@ -164,8 +162,6 @@ int ResolveOptions(const ParsedArgs& args, Options& options) {
                                         "bundled demo device";
     return kExitOk;
 }
-
-#if defined(VENLOMER_TOOL_FLOORPLAN)
 
 using Text = Port::StringBase<char>;
 template <class T> using Ptr = CommonI::RefCountPtr<T>;
@@ -690,14 +686,11 @@ int Draw(Model& m, const ChipDb& db, const Options& options) {
     return kExitOk;
 }
 
-#endif
-
 int Run(const ParsedArgs& args) {
     Options options;
     if (int status = ResolveOptions(args, options); status != kExitOk) {
         return status;
     }
-#if defined(VENLOMER_TOOL_FLOORPLAN)
     ChipDb db;
     std::string error;
     if (!ReadChipDbFile(options.chipDb, options.package, db, error)) {
@@ -724,9 +717,6 @@ int Run(const ParsedArgs& args) {
         Search(model, options, wanted);
     }
     return Draw(model, db, options);
-#else
-    return NotAvailable(kCommand, "device resources, tree model, search or colour manager");
-#endif
 }
 
 } // namespace

@@ -6,26 +6,21 @@
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
 
-#include <cstdio>
-#include <filesystem>
-
-#if __has_include("s/Utilities.h") && __has_include("designmodel/Nmod_Model.h")
-#define VENLOMER_TOOL_NETLIST 1
 #include "designmodel/Nmod_Exception.h"
 #include "designmodel/Nmod_Model.h"
 #include "s/Utilities.h"
-#endif
+
+#include <cstdio>
+#include <filesystem>
 
 namespace VnTool {
 
 namespace {
 
-[[maybe_unused]] bool Exists(const std::string& path) {
+bool Exists(const std::string& path) {
     std::error_code ec;
     return std::filesystem::exists(path, ec);
 }
-
-#if defined(VENLOMER_TOOL_NETLIST)
 
 int RunStub(const ParsedArgs& args) {
     const std::string& ngd = args.operands[0];
@@ -82,20 +77,6 @@ int RunSample(const ParsedArgs& args) {
                 out.c_str(), design.c_str(), part.c_str(), block.c_str());
     return kExitOk;
 }
-
-#else
-
-int RunStub(const ParsedArgs& /*args*/) {
-    return NotAvailable("ngc-stub", "netlist stubs");
-}
-int RunNew(const ParsedArgs& /*args*/) {
-    return NotAvailable("ngc-new", "netlist stubs");
-}
-int RunSample(const ParsedArgs& /*args*/) {
-    return NotAvailable("ngd-sample", "design-model library");
-}
-
-#endif
 
 } // namespace
 

@@ -7,13 +7,10 @@
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
 
+#include "s/ProjFileHelper.h"
+
 #include <cstdio>
 #include <cstdlib>
-
-#if __has_include("s/ProjFileHelper.h")
-#define VENLOMER_TOOL_PROJECT 1
-#include "s/ProjFileHelper.h"
-#endif
 
 namespace VnTool {
 
@@ -22,7 +19,6 @@ namespace {
 const char kCommand[] = "project-files";
 
 int Run(const ParsedArgs& args) {
-#if defined(VENLOMER_TOOL_PROJECT)
     if (args.Has("--project")) {
         // The sample host reads its description from the environment, as the real host
         // takes its project from its own session.
@@ -42,10 +38,6 @@ int Run(const ParsedArgs& args) {
         return Refused(kCommand, why);
     }
     return kExitOk;
-#else
-    (void)args;
-    return NotAvailable(kCommand, "project file lookup");
-#endif
 }
 
 } // namespace
