@@ -41,27 +41,6 @@ TEST(ToolArgs, ValuesFlagsAndOperandsAreTakenInAnyOrder) {
     EXPECT_EQ(out.operands, std::vector<std::string>{"-"});
 }
 
-TEST(ToolArgs, MisuseIsRefusedWithAReason) {
-    struct Case {
-        std::vector<std::string> args;
-        const char* reason;
-    };
-    const Case cases[] = {
-        {{"in", "--nope"}, "unknown option --nope"},
-        {{"in", "--svg"}, "needs a value"},
-        {{"in", "--svg", "a", "--svg", "b"}, "given twice"},
-        {{"in", "--quiet=yes"}, "takes no value"},
-        {{}, "missing operand"},
-        {{"a", "b", "c"}, "unexpected operand c"},
-    };
-    for (const auto& c : cases) {
-        ParsedArgs out;
-        std::string error;
-        EXPECT_FALSE(Parse(c.args, out, error)) << c.reason;
-        EXPECT_NE(error.find(c.reason), std::string::npos) << error;
-    }
-}
-
 TEST(ToolSvg, TextFromOutsideIsEscaped) {
     EXPECT_EQ(VnTool::XmlEscape("<a & 'b' \"c\">"), "&lt;a &amp; &apos;b&apos; &quot;c&quot;&gt;");
     EXPECT_EQ(VnTool::XmlEscape(std::string("x\x01y", 3)), "x?y");
