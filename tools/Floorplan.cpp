@@ -30,6 +30,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <initializer_list>
 #include <list>
 #include <memory>
 #include <string>
@@ -313,32 +314,34 @@ void AddInt(ToolResource* r, const char* name, int value) {
 
 void BuildResources(const ChipDb& db, Model& m) {
     m.tileTypes = {Text("logic"), Text("io"), Text("ramb"), Text("ramt")};
-    // Fixed column order for every kind, whatever order properties arrive in.
-    for (const char* name : {"Name", "Package", "Width", "Height"}) {
-        m.deviceNames.AddName(name,
-                              std::string(name) == "Name" || std::string(name) == "Package"
-                                  ? VnI::STRING_TYPE
-                                  : VnI::INT_TYPE,
-                              true);
-    }
-    m.bankNames.AddName("Name", VnI::STRING_TYPE, true);
-    m.bankNames.AddName("Bank", VnI::INT_TYPE, true);
-    m.bankNames.AddName("Edge", VnI::STRING_TYPE, true);
-    m.bankNames.AddName("Pins", VnI::INT_TYPE, true);
-    m.tileNames.AddName("Name", VnI::STRING_TYPE, true);
+    // Names are declared up front so that every kind lists its columns in this order,
+    // whatever order properties arrive in.
+    struct Column {
+        const char* name;
+        VnI::PropertyType type;
+    };
+    auto declare = [](Vn::Eng::PropertyNameList& list, std::initializer_list<Column> columns) {
+        for (const Column& column : columns) {
+            list.AddName(column.name, column.type, true);
+        }
+    };
+    const auto text = VnI::STRING_TYPE;
+    const auto number = VnI::INT_TYPE;
+    declare(m.deviceNames,
+            {{"Name", text}, {"Package", text}, {"Width", number}, {"Height", number}});
+    declare(m.bankNames, {{"Name", text}, {"Bank", number}, {"Edge", text}, {"Pins", number}});
+    declare(m.tileNames, {{"Name", text}});
     {
         auto prototype = Adopt(Vn::Eng::PropertyFactory::CreateEnumProperty(m.tileTypes, "", true));
         m.tileNames.AddEnumName("Type", VnI::ENUM_TYPE, prototype->GetPossibleValues(), true);
     }
-    m.tileNames.AddName("X", VnI::INT_TYPE, true);
-    m.tileNames.AddName("Y", VnI::INT_TYPE, true);
-    for (const char* name : {"Name", "Bank", "Tile", "X", "Y", "Block"}) {
-        m.pinNames.AddName(name,
-                           std::string(name) == "Name" || std::string(name) == "Tile"
-                               ? VnI::STRING_TYPE
-                               : VnI::INT_TYPE,
-                           true);
-    }
+    declare(m.tileNames, {{"X", number}, {"Y", number}});
+    declare(m.pinNames, {{"Name", text},
+                         {"Bank", number},
+                         {"Tile", text},
+                         {"X", number},
+                         {"Y", number},
+                         {"Block", number}});
 
     m.device = m.Make<ToolResource>(m.deviceNames, "", -1, -1, "DEVICE");
     AddText(m.device, "Name", db.device);
