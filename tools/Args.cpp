@@ -5,8 +5,8 @@ namespace VnTool {
 
 namespace {
 
-const OptionSpec* FindOption(const CommandSpec& spec, const std::string& name) {
-    for (const auto& option : spec.options) {
+const OptionSyntax* FindOption(const CommandSyntax& syntax, const std::string& name) {
+    for (const auto& option : syntax.options) {
         if (option.name == name) {
             return &option;
         }
@@ -16,7 +16,7 @@ const OptionSpec* FindOption(const CommandSpec& spec, const std::string& name) {
 
 } // namespace
 
-bool ParseArgs(const CommandSpec& spec, const std::vector<std::string>& args, ParsedArgs& out,
+bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args, ParsedArgs& out,
                std::string& error) {
     out = ParsedArgs{};
     bool operandsOnly = false;
@@ -46,7 +46,7 @@ bool ParseArgs(const CommandSpec& spec, const std::vector<std::string>& args, Pa
             value = arg.substr(eq + 1);
             inlineValue = true;
         }
-        const OptionSpec* option = FindOption(spec, name);
+        const OptionSyntax* option = FindOption(syntax, name);
         if (option == nullptr) {
             error = "unknown option " + name;
             return false;
@@ -75,28 +75,28 @@ bool ParseArgs(const CommandSpec& spec, const std::vector<std::string>& args, Pa
     if (out.help) {
         return true;
     }
-    if (out.operands.size() < spec.minOperands) {
-        error = "missing operand" + std::string(spec.operands.empty() ? "" : ": expected ") +
-                spec.operands;
+    if (out.operands.size() < syntax.minOperands) {
+        error = "missing operand" + std::string(syntax.operands.empty() ? "" : ": expected ") +
+                syntax.operands;
         return false;
     }
-    if (out.operands.size() > spec.maxOperands) {
-        error = "unexpected operand " + out.operands[spec.maxOperands];
+    if (out.operands.size() > syntax.maxOperands) {
+        error = "unexpected operand " + out.operands[syntax.maxOperands];
         return false;
     }
     return true;
 }
 
-std::string HelpText(const CommandSpec& spec) {
-    std::string text = "usage: venlomer " + spec.name;
-    if (!spec.options.empty()) {
+std::string HelpText(const CommandSyntax& syntax) {
+    std::string text = "usage: venlomer " + syntax.name;
+    if (!syntax.options.empty()) {
         text += " [options]";
     }
-    if (!spec.operands.empty()) {
-        text += " " + spec.operands;
+    if (!syntax.operands.empty()) {
+        text += " " + syntax.operands;
     }
-    text += "\n\n" + spec.summary + "\n\noptions:\n";
-    std::vector<OptionSpec> all = spec.options;
+    text += "\n\n" + syntax.summary + "\n\noptions:\n";
+    std::vector<OptionSyntax> all = syntax.options;
     all.push_back({"--verbose", "", "show the library's debug messages too"});
     all.push_back({"--help", "", "show this help and exit"});
     for (const auto& option : all) {
@@ -108,8 +108,8 @@ std::string HelpText(const CommandSpec& spec) {
         }
         text += left + option.help + "\n";
     }
-    if (!spec.details.empty()) {
-        text += "\n" + spec.details;
+    if (!syntax.details.empty()) {
+        text += "\n" + syntax.details;
         if (text.back() != '\n') {
             text += "\n";
         }

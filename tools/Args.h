@@ -18,17 +18,17 @@ namespace VnTool {
 /// Exit statuses of the tool.
 enum ExitStatus : int { kExitOk = 0, kExitRefused = 1, kExitUsage = 2 };
 
-struct OptionSpec {
+struct OptionSyntax {
     std::string name;  ///< with the leading dashes, such as "--svg"
     std::string value; ///< placeholder of its value ("OUT"); empty for a flag
     std::string help;
 };
 
-struct CommandSpec {
+struct CommandSyntax {
     std::string name;
     std::string operands; ///< operand placeholders for the synopsis ("NGD NGC")
     std::string summary;
-    std::vector<OptionSpec> options;
+    std::vector<OptionSyntax> options;
     std::size_t minOperands = 0;
     std::size_t maxOperands = 0;
     std::string details; ///< printed after the options in --help
@@ -52,11 +52,11 @@ struct ParsedArgs {
 
 /// Parses the arguments after the subcommand name. Accepts "--opt VALUE", "--opt=VALUE",
 /// "--" before operands that start with a dash, and --help/-h and --verbose everywhere.
-/// Returns false with a one-line reason when the arguments do not fit the spec.
-bool ParseArgs(const CommandSpec& spec, const std::vector<std::string>& args, ParsedArgs& out,
+/// Returns false with a one-line reason when the arguments do not fit the syntax.
+bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args, ParsedArgs& out,
                std::string& error);
 
 /// The --help text of a subcommand.
-std::string HelpText(const CommandSpec& spec);
+std::string HelpText(const CommandSyntax& syntax);
 
 } // namespace VnTool

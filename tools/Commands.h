@@ -8,7 +8,7 @@
 namespace VnTool {
 
 struct Command {
-    CommandSpec spec;
+    CommandSyntax syntax;
     int (*run)(const ParsedArgs& args);
 };
 

@@ -34,7 +34,7 @@ void PrintToolHelp() {
                 "Runs the venlomer library's device-resource, search, selection, colour,\n"
                 "netlist and project services from the command line.\n\ncommands:\n");
     for (const Command* command : AllCommands()) {
-        std::printf("  %-15s %s\n", command->spec.name.c_str(), command->spec.summary.c_str());
+        std::printf("  %-15s %s\n", command->syntax.name.c_str(), command->syntax.summary.c_str());
     }
     std::printf("\nRun 'venlomer COMMAND --help' for a command's options.\n"
                 "Exit status: 0 success, 1 refused operation, 2 bad usage.\n");
@@ -113,7 +113,7 @@ int main(int argc, char** argv) {
     }
     const Command* command = nullptr;
     for (const Command* candidate : AllCommands()) {
-        if (candidate->spec.name == name) {
+        if (candidate->syntax.name == name) {
             command = candidate;
         }
     }
@@ -124,11 +124,11 @@ int main(int argc, char** argv) {
     VnTool::ParsedArgs parsed;
     std::string error;
     std::vector<std::string> rest(args.begin() + static_cast<long>(first) + 1, args.end());
-    if (!VnTool::ParseArgs(command->spec, rest, parsed, error)) {
+    if (!VnTool::ParseArgs(command->syntax, rest, parsed, error)) {
         return VnTool::UsageError(name, error);
     }
     if (parsed.help) {
-        std::fputs(VnTool::HelpText(command->spec).c_str(), stdout);
+        std::fputs(VnTool::HelpText(command->syntax).c_str(), stdout);
         return VnTool::kExitOk;
     }
     g_verbose = g_verbose || parsed.verbose;

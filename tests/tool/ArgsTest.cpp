@@ -6,10 +6,10 @@
 
 namespace {
 
-using VnTool::CommandSpec;
+using VnTool::CommandSyntax;
 using VnTool::ParsedArgs;
 
-CommandSpec Spec() {
+CommandSyntax Syntax() {
     return {"demo",
             "IN [OUT]",
             "a demonstration",
@@ -20,7 +20,7 @@ CommandSpec Spec() {
 }
 
 bool Parse(std::vector<std::string> args, ParsedArgs& out, std::string& error) {
-    return VnTool::ParseArgs(Spec(), args, out, error);
+    return VnTool::ParseArgs(Syntax(), args, out, error);
 }
 
 TEST(ToolArgs, ValuesFlagsAndOperandsAreTakenInAnyOrder) {
