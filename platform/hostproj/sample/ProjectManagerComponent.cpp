@@ -250,15 +250,19 @@ Network::Network(std::shared_ptr<const Description> description)
 Network::~Network() = default;
 
 /// Iterators keep the network alive, so the elements they hand out stay valid.
-class UnitIterator final : public HostObject, public Dpm::IDesignUnitIterator {
+// One iterator over a view's design units or its binding instances: both are walked by
+// position, and both keep the view's network alive while they live.
+template <class Iterator, class Element, std::size_t (View::*Count)() const,
+          auto(View::*At)(std::size_t) const>
+class PositionIterator final : public HostObject, public Iterator {
 public:
-    explicit UnitIterator(View& view)
+    explicit PositionIterator(View& view)
         : HostObject(g_alive, view.Owner().CountingMode()), m_network(&view.Owner()), m_view(view) {
     }
 
     CitI::IInterface* GetInterface(const Port::XUID& id) override { return Ask(id); }
-    Dpm::IDesignUnit* CurrentItem() override {
-        return IsEnd() ? nullptr : static_cast<Dpm::IDesignUnit*>(m_view.UnitAt(m_pos));
+    Element* CurrentItem() override {
+        return IsEnd() ? nullptr : static_cast<Element*>((m_view.*At)(m_pos));
     }
     std::int64_t First() override {
         m_pos = 0;
@@ -270,13 +274,12 @@ public:
         }
         return 1;
     }
-    bool IsEnd() override { return m_pos >= m_view.NumUnits(); }
+    bool IsEnd() override { return m_pos >= (m_view.*Count)(); }
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Dpm::IDesignUnitIterator::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Dpm::IDesignUnitIterator*>(this)
-                   : nullptr;
+        return id == Iterator::IID() || id == CitI::IID_IInterface ? static_cast<Iterator*>(this)
+                                                                   : nullptr;
     }
 
 private:
@@ -285,41 +288,11 @@ private:
     std::size_t m_pos = 0;
 };
 
-class BindingIterator final : public HostObject, public Dpm::ITransformBindingInstanceIterator {
-public:
-    explicit BindingIterator(View& view)
-        : HostObject(g_alive, view.Owner().CountingMode()), m_network(&view.Owner()), m_view(view) {
-    }
-
-    CitI::IInterface* GetInterface(const Port::XUID& id) override { return Ask(id); }
-    Dpm::ITransformBindingInstance* CurrentItem() override {
-        return IsEnd() ? nullptr
-                       : static_cast<Dpm::ITransformBindingInstance*>(m_view.BindingAt(m_pos));
-    }
-    std::int64_t First() override {
-        m_pos = 0;
-        return 1;
-    }
-    std::int64_t Next() override {
-        if (!IsEnd()) {
-            ++m_pos;
-        }
-        return 1;
-    }
-    bool IsEnd() override { return m_pos >= m_view.NumBindings(); }
-
-protected:
-    CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Dpm::ITransformBindingInstanceIterator::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Dpm::ITransformBindingInstanceIterator*>(this)
-                   : nullptr;
-    }
-
-private:
-    Hold<Network> m_network;
-    View& m_view;
-    std::size_t m_pos = 0;
-};
+using UnitIterator =
+    PositionIterator<Dpm::IDesignUnitIterator, Dpm::IDesignUnit, &View::NumUnits, &View::UnitAt>;
+using BindingIterator =
+    PositionIterator<Dpm::ITransformBindingInstanceIterator, Dpm::ITransformBindingInstance,
+                     &View::NumBindings, &View::BindingAt>;
 
 class BindingSet final : public HostObject, public Dpm::ITransformBindingInstanceSet {
 public:
