@@ -14,7 +14,7 @@ namespace Port {
 
 namespace {
 
-std::string FormatArgs(const char* format, va_list args) {
+__attribute__((format(printf, 1, 0))) std::string FormatArgs(const char* format, va_list args) {
     if (format == nullptr) {
         return {};
     }
