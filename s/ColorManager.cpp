@@ -260,9 +260,8 @@ ColorManager::Color ColorManager::GetSelectedPathColor(int pathId) {
 }
 
 ColorManager::Color ColorManager::GetTileSiteColor(Port::StringBase<char> tileTypeName) {
-    // One hash lookup whether the name is known or new; the name is moved in only when
-    // it is new.
-    auto& entry = m_imp->m_tileTypeColors.try_emplace(std::move(tileTypeName)).first->second;
+    // One look-up whether the name is known or new; the name is moved in only when new.
+    auto& entry = m_imp->m_tileTypeColors[std::move(tileTypeName)];
     if (!entry) {
         // AllocateColor never touches the map, so the entry stays where it is.
         entry = AllocateColor();

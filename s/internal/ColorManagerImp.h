@@ -11,11 +11,12 @@
 #include "CommonI/RefCountPtr.h"
 #include "Port/StringBase.h"
 #include "VnI/IProperty.h"
+#include "s/internal/NameIndex.h"
 
 #include <cstddef>
 #include <cstdint>
-#include <functional>
-#include <unordered_map>
+#include <stdexcept>
+#include <utility>
 #include <vector>
 
 namespace Vn::Eng {
@@ -23,10 +24,44 @@ namespace Vn::Eng {
 // The map keeps each name's hash code in its node: the standard library does so for
 // hashers that are not declared noexcept. Without the codes, finding where a bucket ends
 // hashes the neighbouring names again, and a lookup costs several hashes instead of one.
-struct TileNameHash {
-    std::size_t operator()(const Port::StringBase<char>& name) const {
-        return std::hash<Port::StringBase<char>>{}(name);
+// The tile-type map: exact, case-sensitive names to colours. A flat name index (one
+// probe, no division by a prime) in front of the entries in order of first use; the
+// views ask it for every tile they draw.
+class TileColorMap {
+public:
+    using Color = CommonI::RefCountPtr<VnI::IColorProperty>;
+    using Entry = std::pair<Port::StringBase<char>, Color>;
+
+    /// The entry for name, added holding a null colour when name is new (name is moved
+    /// from only then).
+    Color& operator[](Port::StringBase<char>&& name) {
+        const int found = m_index.Find(name.view());
+        if (found >= 0) {
+            return m_entries[static_cast<std::size_t>(found)].second;
+        }
+        m_index.Append(name.view());
+        return m_entries.emplace_back(std::move(name), Color()).second;
     }
+    /// The entry for name; throws std::out_of_range when there is none, as a map does.
+    const Color& at(const Port::StringBase<char>& name) const {
+        const int found = m_index.Find(name.view());
+        if (found < 0) {
+            throw std::out_of_range("no such tile type");
+        }
+        return m_entries[static_cast<std::size_t>(found)].second;
+    }
+    std::size_t size() const { return m_entries.size(); }
+    bool empty() const { return m_entries.empty(); }
+    void clear() {
+        m_entries.clear();
+        m_index.Clear();
+    }
+    std::vector<Entry>::const_iterator begin() const { return m_entries.begin(); }
+    std::vector<Entry>::const_iterator end() const { return m_entries.end(); }
+
+private:
+    detail::NameIndex m_index;
+    std::vector<Entry> m_entries; // by position in the index
 };
 
 struct ColorManagerImp {
@@ -37,7 +72,7 @@ struct ColorManagerImp {
     Color m_signalColor;
     Color m_switchBoxColor;
     // Looked up by exact name; the iteration order is never used.
-    std::unordered_map<Port::StringBase<char>, Color, TileNameHash> m_tileTypeColors;
+    TileColorMap m_tileTypeColors;
     ColorList m_genericColors;
     std::int32_t m_nextGenericColor = 0;
     ColorList m_selectedPathColors;
