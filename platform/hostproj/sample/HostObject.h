@@ -73,6 +73,14 @@ protected:
     /// This object's own interfaces; null for anything it does not answer.
     virtual CitI::IInterface* Own(const Port::XUID& id) = 0;
 
+    /// The Own of an object with one interface: that interface and CitI::IInterface
+    /// answer self, anything else null.
+    template <class Interface, class Self>
+    static CitI::IInterface* OwnOnly(Self* self, const Port::XUID& id) {
+        return id == Interface::IID() || id == CitI::IID_IInterface ? static_cast<Interface*>(self)
+                                                                    : nullptr;
+    }
+
 private:
     class PrjrepCounter final : public Prjrep::IRefCount {
     public:

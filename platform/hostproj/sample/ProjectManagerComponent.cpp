@@ -139,9 +139,7 @@ public:
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Dpm::IHdlFile::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Dpm::IHdlFile*>(this)
-                   : nullptr;
+        return OwnOnly<Dpm::IHdlFile>(this, id);
     }
 
 private:
@@ -227,11 +225,7 @@ public:
     Binding* BindingAt(std::size_t i) const { return m_bindings[i].get(); }
 
 protected:
-    CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Dpm::IView::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Dpm::IView*>(this)
-                   : nullptr;
-    }
+    CitI::IInterface* Own(const Port::XUID& id) override { return OwnOnly<Dpm::IView>(this, id); }
 
 private:
     Network& m_network;
@@ -277,10 +271,7 @@ public:
     bool IsEnd() override { return m_pos >= (m_view.*Count)(); }
 
 protected:
-    CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Iterator::IID() || id == CitI::IID_IInterface ? static_cast<Iterator*>(this)
-                                                                   : nullptr;
-    }
+    CitI::IInterface* Own(const Port::XUID& id) override { return OwnOnly<Iterator>(this, id); }
 
 private:
     Hold<Network> m_network;
@@ -309,9 +300,7 @@ public:
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Dpm::ITransformBindingInstanceSet::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Dpm::ITransformBindingInstanceSet*>(this)
-                   : nullptr;
+        return OwnOnly<Dpm::ITransformBindingInstanceSet>(this, id);
     }
 
 private:
@@ -342,9 +331,7 @@ public:
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override {
-        return id == Prjrep::IIterator::IID() || id == CitI::IID_IInterface
-                   ? static_cast<Prjrep::IIterator*>(this)
-                   : nullptr;
+        return OwnOnly<Prjrep::IIterator>(this, id);
     }
 
 private:
