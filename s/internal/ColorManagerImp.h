@@ -21,9 +21,6 @@
 
 namespace Vn::Eng {
 
-// The map keeps each name's hash code in its node: the standard library does so for
-// hashers that are not declared noexcept. Without the codes, finding where a bucket ends
-// hashes the neighbouring names again, and a lookup costs several hashes instead of one.
 // The tile-type map: exact, case-sensitive names to colours. A flat name index (one
 // probe, no division by a prime) in front of the entries in order of first use; the
 // views ask it for every tile they draw.
