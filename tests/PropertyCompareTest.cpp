@@ -167,6 +167,14 @@ const Row kEqualsRows[] = {
     {"RegexpIgnoringCaseKeepsWordClass", Str("io_7"), Str("IO\\w\\d"), MATCH_REGEXP | MATCH_IGNORE_CASE, true},
     {"RegexpEmptyPatternMatchesAtStart", Str("Bank12"), Str(""), MATCH_REGEXP, true},
     {"RegexpAlternationIsWholePattern", Str("xyz"), Str("a|x"), MATCH_REGEXP, true},
+    {"RegexpAlternationLaterBranch", Str("Clk3"), Str("Bank|Clk\\d"), MATCH_REGEXP, true},
+    {"RegexpValueShorterThanPrefix", Str("Ban"),    Str("Bank"), MATCH_REGEXP, false},
+    {"RegexpPrefixThenRepetition",   Str("Ban"),    Str("Bank*"), MATCH_REGEXP, true},
+    {"RegexpPrefixThenRepetitionShort", Str("Ba"),  Str("Bank*"), MATCH_REGEXP, false},
+    {"RegexpPrefixIgnoringLatin1Case", Str("\xC9T\xC9"), Str("\xE9t\xE9$"), MATCH_REGEXP | MATCH_IGNORE_CASE, true},
+    {"RegexpPrefixKeepsLatin1Case",  Str("\xC9T\xC9"), Str("\xE9t\xE9$"), MATCH_REGEXP, false},
+    {"RegexpLeadingRepetitionIsInvalid", Str("abc"), Str("*abc"), MATCH_REGEXP, false},
+    {"RegexpEmptyFlagGroupIsInvalid", Str("x"),     Str("(?)?x"), MATCH_REGEXP, false},
     // No match: the plain tests decide on the unchanged texts.
     {"RegexpFallsBackToSubstring",   Str("x(a+b)"), Str("(a+b)"), MATCH_REGEXP | MATCH_SUBSTRING, true},
     {"RegexpAloneHasNoFallback",     Str("x(a+b)"), Str("(a+b)"), MATCH_REGEXP, false},
@@ -300,4 +308,19 @@ TEST(PropertyEquals, ReadsAForeignTextPropertyThroughItsInterface) {
     EXPECT_TRUE(Str("xBANK12")()->Equals(host, MATCH_SUBSTRING | MATCH_IGNORE_CASE));
     EXPECT_TRUE(Enum("A")()->LessThan(host, 0));
     EXPECT_FALSE(Enum("C")()->Equals(host, 0));
+}
+
+TEST(PropertyEquals, ReadsAHostSubclassOfOurTextThroughItsOverride) {
+    // A host may derive from our string property and answer another text; the other of a
+    // comparison is read through its interface, so the override decides.
+    class Shown final : public Vn::Eng::StringProperty {
+    public:
+        Shown() : StringProperty(Port::StringBase<char>("stored")) {}
+        Port::StringBase<char> GetStringProperty() const override { return "shown"; }
+    };
+    const Prop shown = Prop::Adopt(static_cast<IProperty*>(new Shown()));
+    EXPECT_TRUE(Str("shown")()->Equals(shown, 0));
+    EXPECT_FALSE(Str("stored")()->Equals(shown, 0));
+    EXPECT_TRUE(Str("shown")()->Equals(shown, MATCH_REGEXP));
+    EXPECT_TRUE(Str("a")()->LessThan(shown, 0));
 }
