@@ -222,9 +222,9 @@ void TileColourMap(benchmark::State& state) {
 
 void RegisterBaselines() {
     const Sizes& sizes = GetSizes();
-    benchmark::RegisterBenchmark("lookup/bag_unordered_map", LookupInBags<Bag>);
-    benchmark::RegisterBenchmark("lookup/bag_map", LookupInBags<OrderedBag>);
-    benchmark::RegisterBenchmark("lookup/floor", LookupFloor);
+    PerCall(benchmark::RegisterBenchmark("lookup/bag_unordered_map", LookupInBags<Bag>));
+    PerCall(benchmark::RegisterBenchmark("lookup/bag_map", LookupInBags<OrderedBag>));
+    PerCall(benchmark::RegisterBenchmark("lookup/floor", LookupFloor));
     benchmark::RegisterBenchmark("bytes/bag_unordered_map", BagBytes)->Iterations(1);
     benchmark::RegisterBenchmark("search_int/bags", SearchBagsIntExact)
         ->Iterations(sizes.tiny ? 1 : 5);
@@ -233,7 +233,7 @@ void RegisterBaselines() {
     benchmark::RegisterBenchmark("selection/list_small", ListSelection, sizes.small)->Iterations(1);
     benchmark::RegisterBenchmark("selection/list_medium", ListSelection, sizes.medium)
         ->Iterations(1);
-    benchmark::RegisterBenchmark("colour/unordered_map", TileColourMap);
+    PerCall(benchmark::RegisterBenchmark("colour/unordered_map", TileColourMap));
     benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small)
         ->Iterations(sizes.tiny ? 1 : 30);
     benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large)

@@ -30,6 +30,14 @@ void RegisterBaselines();
 void RegisterLibraryBenchmarks();
 void RegisterHolderBenchmarks();
 
+/// A per-call measurement: many short repetitions rather than a few long ones, so a burst
+/// of noise from a neighbour on a shared machine spoils few of them (the fastest counts).
+inline void PerCall(benchmark::internal::Benchmark* benchmark) {
+    if (!GetSizes().tiny) {
+        benchmark->MinTime(0.2)->Repetitions(9);
+    }
+}
+
 /// Reports ns per item through the items-per-second counter.
 inline void SetItems(benchmark::State& state, std::size_t perIteration) {
     state.SetItemsProcessed(static_cast<std::int64_t>(state.iterations()) *

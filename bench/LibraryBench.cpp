@@ -131,7 +131,7 @@ void RegisterLibraryBenchmarks() {
         ->Iterations(repeat * 10);
     benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large)
         ->Iterations(repeat);
-    benchmark::RegisterBenchmark("colour/GetTileSiteColor", TileSiteColour);
+    PerCall(benchmark::RegisterBenchmark("colour/GetTileSiteColor", TileSiteColour));
 }
 
 } // namespace VnBench
