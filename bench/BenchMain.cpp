@@ -66,72 +66,127 @@ private:
     std::map<std::string, Value> m_values;
 };
 
+// A goal is a target the library must meet. A reference row gives context. A bound row
+// is the least work the documented behaviour forces on the goal above it, measured on
+// its own: when the bound alone exceeds the goal's limit, no implementation of that
+// behaviour can meet the goal on this machine, and the goal says so.
+enum class Kind { Goal, Reference, Bound };
+
 struct Target {
+    Kind kind;
     const char* measurement;
     const char* ours;
     const char* baseline;
-    double maxRatio; // ours / baseline must not exceed this
+    double limit; // ours / baseline must not exceed this (for a bound: its goal's limit)
     const char* wording;
+    const char* oursPlus = nullptr; // added to ours, for a bound made of two parts
+    double oursTimes = 1.0;         // ours counted this many times
 };
 
 const Target kTargets[] = {
-    {"GetPropertyByName, 16 props, shared list", "lookup/ours", "lookup/bag_unordered_map", 0.5,
-     ">= 2x faster than bag"},
-    {"GetPropertyByName, 16 props, shared list", "lookup/ours", "lookup/floor", 3.0,
+    {Kind::Goal, "GetPropertyByName, 16 props, shared list", "lookup/ours", "lookup/floor", 3.0,
      "within 3x of floor"},
-    {"  (a counted copy alone: AddRef + Release)", "reference/counted_copy",
-     "lookup/bag_unordered_map", 1e9, "share of the bag's look-up"},
-    {"  (the name's position alone, no copy)", "reference/position_only",
-     "lookup/bag_unordered_map", 1e9, "share of the bag's look-up"},
-    {"bytes per device resource, 8 props", "bytes/ours", "bytes/bag_unordered_map", 0.6,
+    {Kind::Goal, "GetPropertyByName, 16 props, shared list", "lookup/ours",
+     "lookup/bag_unordered_map", 0.5, ">= 2x faster than bag"},
+    {Kind::Reference, "  (a counted copy alone: AddRef + Release)", "reference/counted_copy",
+     "lookup/bag_unordered_map", 0, "share of the bag's look-up"},
+    {Kind::Reference, "  (the name's position alone, no copy)", "reference/position_only",
+     "lookup/bag_unordered_map", 0, "share of the bag's look-up"},
+    {Kind::Bound, "  bound: position + counted copy", "reference/position_only",
+     "lookup/bag_unordered_map", 0.5, "the least a look-up does, vs bag", "reference/counted_copy"},
+    {Kind::Goal, "bytes per device resource, 8 props", "bytes/ours", "bytes/bag_unordered_map", 0.6,
      "<= 0.6x of bag"},
-    {"FindItr 1M resources, int, exact", "search_int/finditr", "search_int/hand_loop", 2.0,
-     "within 2x of hand loop"},
-    {"FindItr 1M resources, int, exact", "search_int/finditr", "search_int/bags", 1.0 / 3.0,
-     ">= 3x faster than bags"},
-    {"FindItr 1M resources, MATCH_REGEXP", "search_regex/finditr_regexp",
+    {Kind::Goal, "FindItr 1M resources, int, exact", "search_int/finditr", "search_int/hand_loop",
+     2.0, "within 2x of hand loop"},
+    {Kind::Goal, "FindItr 1M resources, int, exact", "search_int/finditr", "search_int/bags",
+     1.0 / 3.0, ">= 3x faster than bags"},
+    {Kind::Bound, "  bound: one counted copy per holder", "reference/counted_copy",
+     "search_int/bags", 1.0 / 3.0, "GetPropertyByName's reference, vs bags"},
+    {Kind::Goal, "FindItr 1M resources, MATCH_REGEXP", "search_regex/finditr_regexp",
      "search_regex/finditr_icase_substring", 3.0, "within 3x of icase|substring"},
-    {"FindItr 1M resources, MATCH_REGEXP", "search_regex/finditr_regexp",
+    {Kind::Goal, "FindItr 1M resources, MATCH_REGEXP", "search_regex/finditr_regexp",
      "search_regex/bags_std_regex_per_item", 0.1, ">= 10x faster than std::regex"},
-    {"selection: select, remove in random order", "selection/ours_large", "selection/ours_small",
-     2.0, "per holder: 1M within 2x of 10k"},
-    {"  (baseline std::list, quadratic)", "selection/list_medium", "selection/list_small", 1e9,
-     "for reference"},
-    {"highlight: add, remove in random order", "highlight/ours_large", "highlight/ours_small", 2.0,
-     "per resource: 1M within 2x of 10k"},
-    {"  (bare std::list unlink by iterator)", "reference/list_unlink_large",
-     "reference/list_unlink_small", 1e9, "the documented list alone, 1M vs 10k"},
-    {"tree of siblings: build, walk, copy, destroy", "tree_siblings/large", "tree_siblings/small",
+    {Kind::Goal, "selection: select, remove in random order", "selection/ours_large",
+     "selection/ours_small", 2.0, "per holder: 1M within 2x of 10k"},
+    {Kind::Reference, "  (baseline std::list, quadratic)", "selection/list_medium",
+     "selection/list_small", 0, "for reference"},
+    {Kind::Bound, "  bound: two bare list unlinks at 1M", "reference/list_unlink_large",
+     "selection/ours_small", 2.0, "both lists' unlinks, vs ours at 10k", nullptr, 2.0},
+    {Kind::Goal, "highlight: add, remove in random order", "highlight/ours_large",
+     "highlight/ours_small", 2.0, "per resource: 1M within 2x of 10k"},
+    {Kind::Reference, "  (bare std::list unlink by iterator)", "reference/list_unlink_large",
+     "reference/list_unlink_small", 0, "the documented list alone, 1M vs 10k"},
+    {Kind::Bound, "  bound: one bare list unlink at 1M", "reference/list_unlink_large",
+     "highlight/ours_small", 2.0, "the list's unlink, vs ours at 10k"},
+    {Kind::Goal, "tree of siblings: build, walk, copy, destroy", "tree_siblings/large",
+     "tree_siblings/small", 2.0, "per node: 1M within 2x of 10k"},
+    {Kind::Goal, "tree chain: build, walk, copy, destroy", "tree_chain/large", "tree_chain/small",
      2.0, "per node: 1M within 2x of 10k"},
-    {"tree chain: build, walk, copy, destroy", "tree_chain/large", "tree_chain/small", 2.0,
-     "per node: 1M within 2x of 10k"},
-    {"GetTileSiteColor on a known name", "colour/GetTileSiteColor", "colour/unordered_map", 2.0,
-     "within 2x of unordered_map"},
+    {Kind::Goal, "GetTileSiteColor on a known name", "colour/GetTileSiteColor",
+     "colour/unordered_map", 2.0, "within 2x of unordered_map"},
 };
 
+struct Row {
+    const Target* target;
+    double ours = 0;
+    double baseline = 0;
+    const char* unit = "ns";
+    bool measured = false;
+    double ratio() const { return baseline > 0 ? ours / baseline : 0; }
+    bool withinLimit() const { return ratio() <= target->limit; }
+};
+
+Row Measure(const Target& t, const CollectingReporter& results) {
+    Row row{&t};
+    const auto* ours = results.Find(t.ours);
+    const auto* plus = t.oursPlus != nullptr ? results.Find(t.oursPlus) : nullptr;
+    const auto* base = results.Find(t.baseline);
+    if (ours == nullptr || base == nullptr || (t.oursPlus != nullptr && plus == nullptr)) {
+        return row;
+    }
+    row.ours = ours->value * t.oursTimes + (plus != nullptr ? plus->value : 0);
+    row.baseline = base->value;
+    row.unit = ours->unit[0] == 'B' ? "B" : "ns";
+    row.measured = true;
+    return row;
+}
+
 int PrintTable(const CollectingReporter& results) {
-    std::printf("\n%-46s %12s %12s %9s  %-34s %s\n", "measurement", "ours", "baseline", "ratio",
+    std::vector<Row> rows;
+    for (const Target& t : kTargets) {
+        rows.push_back(Measure(t, results));
+    }
+    std::printf("\n%-46s %12s %12s %9s  %-38s %s\n", "measurement", "ours", "baseline", "ratio",
                 "target", "verdict");
     int missed = 0;
-    for (const Target& t : kTargets) {
-        const auto* ours = results.Find(t.ours);
-        const auto* base = results.Find(t.baseline);
-        if (ours == nullptr || base == nullptr) {
-            std::printf("%-46s %12s %12s %9s  %-34s %s\n", t.measurement, ours ? "" : "-",
-                        base ? "" : "-", "-", t.wording, "not measured");
-            ++missed;
+    for (std::size_t i = 0; i < rows.size(); ++i) {
+        const Row& row = rows[i];
+        const Target& t = *row.target;
+        if (!row.measured) {
+            std::printf("%-46s %12s %12s %9s  %-38s %s\n", t.measurement, "-", "-", "-", t.wording,
+                        "not measured");
+            missed += t.kind == Kind::Goal ? 1 : 0;
             continue;
         }
-        const double ratio = base->value > 0 ? ours->value / base->value : 0;
-        const bool reference = t.maxRatio > 1e8;
-        const bool met = ratio <= t.maxRatio;
-        missed += (!met && !reference) ? 1 : 0;
-        std::printf("%-46s %9.1f %-2s %9.1f %-2s %9.3f  %-34s %s\n", t.measurement, ours->value,
-                    ours->unit[0] == 'B' ? "B" : "ns", base->value,
-                    base->unit[0] == 'B' ? "B" : "ns", ratio, t.wording,
-                    reference ? "-"
-                    : met     ? "met"
-                              : "NOT MET");
+        const char* verdict = "-";
+        if (t.kind == Kind::Goal) {
+            // A goal not met is out of reach when a bound row right below it exceeds the
+            // limit too.
+            bool outOfReach = false;
+            for (std::size_t j = i + 1; j < rows.size() && rows[j].target->kind != Kind::Goal;
+                 ++j) {
+                outOfReach = outOfReach || (rows[j].target->kind == Kind::Bound &&
+                                            rows[j].measured && !rows[j].withinLimit());
+            }
+            verdict = row.withinLimit() ? "met"
+                      : outOfReach      ? "NOT MET: bound below exceeds it"
+                                        : "NOT MET";
+            missed += row.withinLimit() ? 0 : 1;
+        } else if (t.kind == Kind::Bound) {
+            verdict = row.withinLimit() ? "bound within the limit" : "bound exceeds the limit";
+        }
+        std::printf("%-46s %9.1f %-2s %9.1f %-2s %9.3f  %-38s %s\n", t.measurement, row.ours,
+                    row.unit, row.baseline, row.unit, row.ratio(), t.wording, verdict);
     }
     if (GetSizes().tiny) {
         std::printf(
