@@ -1,10 +1,14 @@
 // Compares a text property with an arbitrary value, pattern and flags: a pattern typed
 // into a search box reaches the regular-expression path unfiltered and must never crash
-// or hang it.
+// or hang it. Also checks the assumption the regular-expression path rests on: under a
+// match anchored at the start, a leading ^ changes no outcome of a valid expression.
+#include "Port/Regexp.h"
 #include "s/PropertyFactory.h"
 
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
+#include <string>
 #include <string_view>
 
 using CommonI::RefCountPtr;
@@ -31,5 +35,14 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     (void)mine->Equals(theirs, flags);
     (void)mine->Equals(theirs, flags | VnI::MATCH_REGEXP);
     (void)mine->LessThan(theirs, flags);
+
+    const std::string flagsPart = (flags & VnI::MATCH_IGNORE_CASE) != 0 ? "(?i)" : "";
+    const Port_Regexp plain(std::string_view(flagsPart + std::string(pattern)));
+    if (plain.IsValid()) {
+        const Port_Regexp anchored(std::string_view(flagsPart + "^" + std::string(pattern)));
+        if (anchored.IsValid() && anchored.MatchesAtStart(value) != plain.MatchesAtStart(value)) {
+            std::abort();
+        }
+    }
     return 0;
 }
