@@ -1,57 +1,13 @@
-// What the holder's hot paths cost in allocations, counted by a replaced operator new.
+// What the holder's hot paths cost in allocations.
 #include "s/PropertyFactory.h"
 #include "s/PropertyHolder.h"
 #include "s/PropertyNameList.h"
 
+#include "CountingNew.h"
+
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-#include <new>
 #include <string>
-
-namespace {
-thread_local long t_allocations = 0;
-}
-
-// Default visibility: the library's own calls to operator new must land here too. Every
-// plain form is replaced, so nothing allocated by one allocator is freed by another (the
-// sanitizers tell the forms apart).
-#define VN_REPLACED __attribute__((visibility("default")))
-
-VN_REPLACED void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-    ++t_allocations;
-    return std::malloc(size != 0 ? size : 1);
-}
-VN_REPLACED void* operator new(std::size_t size) {
-    if (void* p = operator new(size, std::nothrow)) {
-        return p;
-    }
-    throw std::bad_alloc();
-}
-VN_REPLACED void* operator new[](std::size_t size) {
-    return operator new(size);
-}
-VN_REPLACED void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {
-    return operator new(size, tag);
-}
-VN_REPLACED void operator delete(void* p) noexcept {
-    std::free(p);
-}
-VN_REPLACED void operator delete(void* p, std::size_t) noexcept {
-    std::free(p);
-}
-VN_REPLACED void operator delete(void* p, const std::nothrow_t&) noexcept {
-    std::free(p);
-}
-VN_REPLACED void operator delete[](void* p) noexcept {
-    std::free(p);
-}
-VN_REPLACED void operator delete[](void* p, std::size_t) noexcept {
-    std::free(p);
-}
-VN_REPLACED void operator delete[](void* p, const std::nothrow_t&) noexcept {
-    std::free(p);
-}
 
 using CommonI::RefCountPtr;
 using Port::StringBase;
@@ -80,13 +36,6 @@ StringBase<char> NameOf(int i) {
     return StringBase<char>(("Name" + std::to_string(i)).c_str());
 }
 
-// Allocations made by one call.
-template <class F> long Allocations(F f) {
-    const long before = t_allocations;
-    f();
-    return t_allocations - before;
-}
-
 } // namespace
 
 TEST(HolderAllocations, LookUpByNameAllocatesNothing) {
@@ -97,9 +46,11 @@ TEST(HolderAllocations, LookUpByNameAllocatesNothing) {
     }
     const StringBase<char> wanted = NameOf(33);
     const StringBase<char> unknown("Nowhere");
-    EXPECT_EQ(Allocations([&] { EXPECT_EQ(pin.GetPropertyByName(wanted)->GetIntProperty(), 33); }),
+    EXPECT_EQ(VnTest::AllocationsOf(
+                  [&] { EXPECT_EQ(pin.GetPropertyByName(wanted)->GetIntProperty(), 33); }),
               0);
-    EXPECT_EQ(Allocations([&] { EXPECT_EQ(pin.GetPropertyByName(unknown), nullptr); }), 0);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { EXPECT_EQ(pin.GetPropertyByName(unknown), nullptr); }),
+              0);
 }
 
 TEST(HolderAllocations, SlotsAreReservedForTwiceTheNamesAndAtLeastSixteen) {
@@ -113,31 +64,31 @@ TEST(HolderAllocations, SlotsAreReservedForTwiceTheNamesAndAtLeastSixteen) {
     }
     Pin few(small);
     auto p = Int(0);
-    EXPECT_EQ(Allocations([&] { few.AddProperty(NameOf(1), p); }), 1);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { few.AddProperty(NameOf(1), p); }), 1);
     // Room for 16: growing the list to 16 names and filling them never reallocates.
     for (int i = 3; i < 16; ++i) {
         small.AddName(NameOf(i), VnI::INT_TYPE, true);
     }
     for (int i = 0; i < 16; ++i) {
-        EXPECT_EQ(Allocations([&] { few.AddProperty(NameOf(i), p); }), 0) << i;
+        EXPECT_EQ(VnTest::AllocationsOf([&] { few.AddProperty(NameOf(i), p); }), 0) << i;
     }
     // The 17th name needs room: 34 slots, enough up to 34 names.
     small.AddName(NameOf(16), VnI::INT_TYPE, true);
-    EXPECT_EQ(Allocations([&] { few.AddProperty(NameOf(16), p); }), 1);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { few.AddProperty(NameOf(16), p); }), 1);
     for (int i = 17; i < 34; ++i) {
         small.AddName(NameOf(i), VnI::INT_TYPE, true);
     }
-    EXPECT_EQ(Allocations([&] { few.AddProperty(NameOf(33), p); }), 0);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { few.AddProperty(NameOf(33), p); }), 0);
     small.AddName(NameOf(34), VnI::INT_TYPE, true);
-    EXPECT_EQ(Allocations([&] { few.AddProperty(NameOf(34), p); }), 1);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { few.AddProperty(NameOf(34), p); }), 1);
 
     // A holder whose first add already sees 40 names reserves 80 at once.
     Pin many(schema);
-    EXPECT_EQ(Allocations([&] { many.AddProperty(NameOf(0), p); }), 1);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { many.AddProperty(NameOf(0), p); }), 1);
     for (int i = 40; i < 80; ++i) {
         schema.AddName(NameOf(i), VnI::INT_TYPE, true);
     }
-    EXPECT_EQ(Allocations([&] { many.AddProperty(NameOf(79), p); }), 0);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { many.AddProperty(NameOf(79), p); }), 0);
     schema.AddName(NameOf(80), VnI::INT_TYPE, true);
-    EXPECT_EQ(Allocations([&] { many.AddProperty(NameOf(80), p); }), 1);
+    EXPECT_EQ(VnTest::AllocationsOf([&] { many.AddProperty(NameOf(80), p); }), 1);
 }

@@ -4,36 +4,11 @@
 #include "s/PropertyFactory.h"
 #include "s/PropertyNameList.h"
 
+#include "CountingNew.h"
+
 #include <gtest/gtest.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <new>
-
-namespace {
-std::atomic<long> g_allocations{0};
-} // namespace
-
-void* operator new(std::size_t size) {
-    ++g_allocations;
-    if (void* p = std::malloc(size == 0 ? 1 : size)) {
-        return p;
-    }
-    throw std::bad_alloc();
-}
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-    ++g_allocations;
-    return std::malloc(size == 0 ? 1 : size);
-}
-void operator delete(void* p) noexcept {
-    std::free(p);
-}
-void operator delete(void* p, std::size_t) noexcept {
-    std::free(p);
-}
-void operator delete(void* p, const std::nothrow_t&) noexcept {
-    std::free(p);
-}
+#include <vector>
 
 using CommonI::RefCountPtr;
 using Vn::Eng::PropertyFactory;
@@ -46,12 +21,6 @@ const char kLong[] = "a text well beyond every small-string buffer of the librar
 
 RefCountPtr<const IProperty> Adopt(IProperty* raw) {
     return RefCountPtr<const IProperty>::Adopt(raw);
-}
-
-template <class F> long AllocationsOf(F&& run) {
-    const long before = g_allocations.load();
-    run();
-    return g_allocations.load() - before;
 }
 
 } // namespace
@@ -67,10 +36,10 @@ TEST(HotPathAllocations, PlainComparisonsAllocateNothing) {
     const auto e = Adopt(PropertyFactory::CreateEnumProperty(values, "", true));
 
     // The counter sees the allocations of the library: copying a long text is one.
-    ASSERT_GT(AllocationsOf([&] { (void)s1->GetStringProperty(); }), 0);
+    ASSERT_GT(VnTest::AllocationsOf([&] { (void)s1->GetStringProperty(); }), 0);
 
     bool all = true;
-    EXPECT_EQ(AllocationsOf([&] {
+    EXPECT_EQ(VnTest::AllocationsOf([&] {
                   all = all && !i1->Equals(i2, 0) && i1->Equals(i2, VnI::MATCH_WITHIN_5_PERCENT);
                   all = all && d1->Equals(d2, VnI::MATCH_EXACT);
                   all = all && s1->Equals(s2, 0) && s1->Equals(s2, VnI::MATCH_SUBSTRING);
@@ -88,7 +57,7 @@ TEST(HotPathAllocations, NameLookupBuildsNoString) {
     const Port::StringBase<char> absent("another text well beyond every small-string buffer");
     int found = 0;
     int missing = 0;
-    EXPECT_EQ(AllocationsOf([&] {
+    EXPECT_EQ(VnTest::AllocationsOf([&] {
                   found = list.Contains(wanted);
                   missing = list.Contains(absent);
               }),
