@@ -61,6 +61,8 @@ public:
 
 private:
     static constexpr std::uint32_t kEmpty = 0xFFFFFFFFu;
+    static constexpr std::uint64_t kMix0 = 0x9E3779B97F4A7C15u;
+    static constexpr std::uint64_t kMix1 = 0xC2B2AE3D27D4EB4Fu;
     // The tag is 24 bits of hash above the length (capped at 255), so equal tags and
     // equal heads prove a text of up to eight bytes equal without reading it.
     struct Slot {
@@ -111,12 +113,10 @@ private:
     }
 
     static Key MakeKey(std::string_view text) {
-        constexpr std::uint64_t k0 = 0x9E3779B97F4A7C15u;
-        constexpr std::uint64_t k1 = 0xC2B2AE3D27D4EB4Fu;
         const char* p = text.data();
         const std::size_t n = text.size();
         const std::uint64_t head = Head(p, n);
-        std::uint64_t hash = Mix(head ^ k0, n ^ k1);
+        std::uint64_t hash = Mix(head ^ kMix0, n ^ kMix1);
         if (n > 8) {
             hash = LongHash(p, n, hash);
         }
@@ -130,12 +130,10 @@ private:
     // path stays small.
     [[gnu::noinline]] static std::uint64_t LongHash(const char* p, std::size_t n,
                                                     std::uint64_t hash) {
-        constexpr std::uint64_t k0 = 0x9E3779B97F4A7C15u;
-        constexpr std::uint64_t k1 = 0xC2B2AE3D27D4EB4Fu;
         for (std::size_t at = 8; at + 8 < n; at += 8) {
-            hash = Mix(hash ^ Load64(p + at), k0);
+            hash = Mix(hash ^ Load64(p + at), kMix0);
         }
-        return Mix(hash ^ Load64(p + n - 8), k1);
+        return Mix(hash ^ Load64(p + n - 8), kMix1);
     }
 
     [[gnu::noinline]] int FindLong(std::string_view text) const {
