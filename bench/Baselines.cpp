@@ -23,19 +23,19 @@
 
 namespace VnBench {
 
+std::vector<std::string> SixteenNames() {
+    std::vector<std::string> names;
+    for (int i = 0; i < 16; ++i) {
+        names.push_back(std::string("Prop").append(std::to_string(i)));
+    }
+    return names;
+}
+
 namespace {
 
 using Value = std::variant<int, double, std::string, bool>;
 using Bag = std::unordered_map<std::string, std::shared_ptr<Value>>;
 using OrderedBag = std::map<std::string, std::shared_ptr<Value>>;
-
-std::vector<std::string> SixteenNames() {
-    std::vector<std::string> names;
-    for (int i = 0; i < 16; ++i) {
-        names.push_back("Prop" + std::to_string(i));
-    }
-    return names;
-}
 
 template <class BagType> void LookupInBags(benchmark::State& state) {
     const auto names = SixteenNames();
@@ -98,8 +98,8 @@ void BagBytes(benchmark::State& state) {
             bag["Y"] = std::make_shared<Value>(static_cast<int>(i / 100));
             bag["Bank"] = std::make_shared<Value>(static_cast<int>(i % 4));
             bag["Index"] = std::make_shared<Value>(static_cast<int>(i));
-            bag["Name"] = std::make_shared<Value>(std::string("IOB_") + std::to_string(i));
-            bag["Tile"] = std::make_shared<Value>(std::string("T") + std::to_string(i % 997));
+            bag["Name"] = std::make_shared<Value>(std::string("IOB_").append(std::to_string(i)));
+            bag["Tile"] = std::make_shared<Value>(std::string("T").append(std::to_string(i % 997)));
             bag["Type"] = std::make_shared<Value>(std::string("IO"));
             bag["Used"] = std::make_shared<Value>(i % 2 == 0);
         }

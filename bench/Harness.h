@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <string>
+#include <vector>
 
 namespace VnBench {
 
@@ -25,6 +26,9 @@ const Sizes& GetSizes();
 /// Bytes handed out by operator new since the process started (the benchmark program
 /// replaces the global operator new to count them).
 std::uint64_t AllocatedBytes();
+
+/// The sixteen property names the look-up measurements use, ours and the baselines alike.
+std::vector<std::string> SixteenNames();
 
 void RegisterBaselines();
 void RegisterLibraryBenchmarks();

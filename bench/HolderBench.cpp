@@ -52,8 +52,8 @@ VnI::IPropertyNameList* NameInterface(Vn::Eng::PropertyNameList& list) {
 void Lookup(benchmark::State& state) {
     Vn::Eng::PropertyNameList list;
     std::vector<Str> names;
-    for (int i = 0; i < 16; ++i) {
-        names.emplace_back(("Prop" + std::to_string(i)).c_str());
+    for (const std::string& text : SixteenNames()) {
+        names.emplace_back(text);
     }
     std::vector<std::unique_ptr<Pin>> pins;
     for (size_t h = 0; h < GetSizes().holders; ++h) {
@@ -78,8 +78,8 @@ void Lookup(benchmark::State& state) {
 void LookupPositionOnly(benchmark::State& state) {
     Vn::Eng::PropertyNameList list;
     std::vector<Str> names;
-    for (int i = 0; i < 16; ++i) {
-        names.emplace_back(("Prop" + std::to_string(i)).c_str());
+    for (const std::string& text : SixteenNames()) {
+        names.emplace_back(text);
         list.AddName(names.back(), VnI::INT_TYPE, true);
     }
     std::vector<std::unique_ptr<Pin>> pins;
