@@ -71,9 +71,12 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     if (resource == nullptr) {
         return 1;
     }
-    resource->SetHighlighted(true);
-    auto& list = m_imp->m_highlightedItems;
-    const HighlightManagerImp::List::iterator at = list.insert(list.end(), resource);
+    // The list node is made in a list of its own and spliced in (which cannot fail) once
+    // the index holds it, and the flag is set last: a failed allocation leaves list,
+    // index and flag as they were.
+    HighlightManagerImp::List staged;
+    staged.push_back(resource);
+    const HighlightManagerImp::List::iterator at = staged.begin();
     if (HighlightManagerImp::Entries* entries = m_imp->m_index.Find(resource)) {
         if (!entries->later) {
             entries->later = std::make_unique<std::deque<HighlightManagerImp::List::iterator>>();
@@ -82,6 +85,9 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     } else {
         m_imp->m_index.FindOrAdd(resource).oldest = at;
     }
+    auto& list = m_imp->m_highlightedItems;
+    list.splice(list.end(), staged);
+    resource->SetHighlighted(true);
     return 1;
 }
 

@@ -113,8 +113,18 @@ int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::Prope
     if (!created) {
         return -1;
     }
-    const std::uint32_t position = m_imp->m_nameIndex.Append(name.view());
-    m_imp->names.push_back(std::move(created));
+    // Either structure may fail to grow. The vector goes first because taking its last
+    // element back cannot fail; an index that kept a name the vector lacks would put
+    // every later name one position too high (and with it holder slots and indices).
+    auto& names = m_imp->names;
+    names.push_back(std::move(created));
+    std::uint32_t position = 0;
+    try {
+        position = m_imp->m_nameIndex.Append(name.view());
+    } catch (...) {
+        names.pop_back();
+        throw;
+    }
     if (visible) {
         ++m_imp->m_numVisibleNames;
     }

@@ -11,6 +11,7 @@
 
 #include <deque>
 #include <memory>
+#include <new>
 #include <vector>
 
 namespace Vn::Eng {
@@ -89,6 +90,14 @@ struct Record {
     // Files holder under its type unless it is null, refused or already flagged.
     // True when it was selected now (so its subtree is to be visited).
     bool Select(VnI::IPropertyHolder* holder);
+    // Takes back the newest selection, the last of the overall list, while a failed
+    // AddSelectedItem unwinds. Allocates nothing.
+    void UnselectNewest();
+    // Select, then with withChildren the holders below, depth first.
+    void SelectWithChildren(VnI::IPropertyHolder* holder, bool withChildren);
+    // Takes holder out of its category and once out of the overall list. Allocates
+    // nothing but its note for a holder that is not selected.
+    void Unselect(VnI::IPropertyHolder* holder);
 };
 
 bool Record::Select(VnI::IPropertyHolder* holder) {
@@ -111,10 +120,15 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
     if (holder->IsSelected()) {
         return false;
     }
-    holder->SetSelected(true);
-    List& category = m_selectedItems[static_cast<size_t>(type)];
-    const Entry entry{type, category.insert(category.end(), holder),
-                      m_allSelectedItems.insert(m_allSelectedItems.end(), holder), true, true};
+    // Everything that can fail to allocate happens before the lists change: the two list
+    // nodes are made in lists of their own and spliced in (which cannot fail) once the
+    // index holds the entry, and the flag is set last. A failure leaves lists, index and
+    // flag as they were.
+    List inCategory;
+    List inAll;
+    inCategory.push_back(holder);
+    inAll.push_back(holder);
+    const Entry entry{type, inCategory.begin(), inAll.begin(), true, true};
     Positions& at = m_index.FindOrAdd(holder);
     if (!at.first.Used()) {
         at.first = entry;
@@ -124,7 +138,102 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
         }
         at.more->push_back(entry);
     }
+    List& category = m_selectedItems[static_cast<size_t>(type)];
+    category.splice(category.end(), inCategory);
+    m_allSelectedItems.splice(m_allSelectedItems.end(), inAll);
+    holder->SetSelected(true);
     return true;
+}
+
+void Record::UnselectNewest() {
+    VnI::IPropertyHolder* holder = m_allSelectedItems.back();
+    Positions* at = m_index.Find(holder);
+    Entry& newest = at->more && !at->more->empty() ? at->more->back() : at->first;
+    m_selectedItems[static_cast<size_t>(newest.category)].erase(newest.inCategory);
+    m_allSelectedItems.erase(newest.inAll);
+    if (&newest == &at->first) {
+        newest = Entry();
+        if (!at->Normalize()) {
+            m_index.Erase(holder);
+        }
+    } else {
+        at->more->pop_back();
+    }
+    holder->SetSelected(false);
+}
+
+void Record::SelectWithChildren(VnI::IPropertyHolder* holder, bool withChildren) {
+    if (!Select(holder) || !withChildren) {
+        return;
+    }
+    // Depth first, each holder before the holders below it, as a recursive walk would
+    // visit them; the work list holds one child iterator per level. Every level stands on
+    // a holder selected just now, so the walk ends even if tree links loop.
+    struct Level {
+        CommonI::RefCountPtr<VnI::ITreeNode> node; // keeps the iterator's tree alive
+        CommonI::RefCountPtr<VnI::ITreeNodeItr> children;
+    };
+    std::vector<Level> work;
+    const auto descend = [&work](VnI::IPropertyHolder* from) {
+        if (auto node = from->GetParentTreeNode()) {
+            auto children = node->GetChildren();
+            if (children) {
+                work.push_back({std::move(node), std::move(children)});
+            }
+        }
+    };
+    descend(holder);
+    while (!work.empty()) {
+        VnI::ITreeNodeItr& children = *work.back().children;
+        if (children.IsEnd()) {
+            work.pop_back();
+            continue;
+        }
+        const auto child = children.CurrentItem();
+        children.Next();
+        // A child without a holder is a group node: it is skipped with its subtree.
+        VnI::IPropertyHolder* below = child ? child->GetDataRef() : nullptr;
+        if (Select(below)) {
+            descend(below);
+        }
+    }
+}
+
+void Record::Unselect(VnI::IPropertyHolder* holder) {
+    const int type = holder->GetType();
+    Positions* at = m_index.Find(holder);
+    bool listed = false;
+    if (at != nullptr && type >= 0 && static_cast<size_t>(type) < m_selectedItems.size()) {
+        at->ForEach(
+            [&](const Entry& e) { listed = listed || (e.hasCategory && e.category == type); });
+    }
+    if (!listed) {
+        // Only a note for the developer: losing it to a failed allocation must not stop a
+        // removal that is half done.
+        try {
+            Port_MsgManData::debugStub("Trying to remove an item that doesn't exist");
+        } catch (const std::bad_alloc&) {
+        }
+        return;
+    }
+    holder->SetSelected(false);
+    List& category = m_selectedItems[static_cast<size_t>(type)];
+    // Out of its category wholly, out of the overall list once (its oldest place).
+    bool allTaken = false;
+    at->ForEach([&](Entry& e) {
+        if (e.hasCategory && e.category == type) {
+            category.erase(e.inCategory);
+            e.hasCategory = false;
+        }
+        if (!allTaken && e.hasAll) {
+            m_allSelectedItems.erase(e.inAll);
+            e.hasAll = false;
+            allTaken = true;
+        }
+    });
+    if (!at->Normalize()) {
+        m_index.Erase(holder);
+    }
 }
 
 } // namespace SelectionManagerImp
@@ -156,39 +265,20 @@ int SelectionManager::GetNumCategories() const {
 }
 
 std::int64_t SelectionManager::AddSelectedItem(VnI::IPropertyHolder* holder, bool withChildren) {
-    if (!m_imp->Select(holder) || !withChildren) {
-        return 1;
-    }
-    // Depth first, each holder before the holders below it, as a recursive walk would
-    // visit them; the work list holds one child iterator per level. Every level stands on
-    // a holder selected just now, so the walk ends even if tree links loop.
-    struct Level {
-        CommonI::RefCountPtr<VnI::ITreeNode> node; // keeps the iterator's tree alive
-        CommonI::RefCountPtr<VnI::ITreeNodeItr> children;
-    };
-    std::vector<Level> work;
-    const auto descend = [&work](VnI::IPropertyHolder* from) {
-        if (auto node = from->GetParentTreeNode()) {
-            auto children = node->GetChildren();
-            if (children) {
-                work.push_back({std::move(node), std::move(children)});
-            }
+    // A failure part way leaves the selection as it was: the categories added and every
+    // holder selected by this call are taken back, newest first. Each holder selected
+    // here stands at the end of the overall list, so its length before the call tells
+    // them apart from older selections.
+    const std::size_t categoriesBefore = m_imp->m_selectedItems.size();
+    const std::size_t selectedBefore = m_imp->m_allSelectedItems.size();
+    try {
+        m_imp->SelectWithChildren(holder, withChildren);
+    } catch (...) {
+        while (m_imp->m_allSelectedItems.size() > selectedBefore) {
+            m_imp->UnselectNewest();
         }
-    };
-    descend(holder);
-    while (!work.empty()) {
-        VnI::ITreeNodeItr& children = *work.back().children;
-        if (children.IsEnd()) {
-            work.pop_back();
-            continue;
-        }
-        const auto child = children.CurrentItem();
-        children.Next();
-        // A child without a holder is a group node: it is skipped with its subtree.
-        VnI::IPropertyHolder* below = child ? child->GetDataRef() : nullptr;
-        if (m_imp->Select(below)) {
-            descend(below);
-        }
+        m_imp->m_selectedItems.resize(categoriesBefore);
+        throw;
     }
     return 1;
 }
@@ -197,45 +287,21 @@ std::int64_t SelectionManager::RemoveSelectedItem(VnI::IPropertyHolder* holder, 
     if (holder == nullptr) {
         return 1;
     }
-    const int type = holder->GetType();
-    SelectionManagerImp::Positions* at = m_imp->m_index.Find(holder);
-    bool listed = false;
-    if (at != nullptr && type >= 0 && type < GetNumCategories()) {
-        at->ForEach([&](const SelectionManagerImp::Entry& e) {
-            listed = listed || (e.hasCategory && e.category == type);
-        });
-    }
-    if (!listed) {
-        Port_MsgManData::debugStub("Trying to remove an item that doesn't exist");
-    } else {
-        holder->SetSelected(false);
-        SelectionManagerImp::List& category = m_imp->m_selectedItems[static_cast<size_t>(type)];
-        // Out of its category wholly, out of the overall list once (its oldest place).
-        bool allTaken = false;
-        at->ForEach([&](SelectionManagerImp::Entry& e) {
-            if (e.hasCategory && e.category == type) {
-                category.erase(e.inCategory);
-                e.hasCategory = false;
-            }
-            if (!allTaken && e.hasAll) {
-                m_imp->m_allSelectedItems.erase(e.inAll);
-                e.hasAll = false;
-                allTaken = true;
-            }
-        });
-        if (!at->Normalize()) {
-            m_imp->m_index.Erase(holder);
+    // The children's iterator is the one allocation here, so it is taken before anything
+    // changes: if it cannot be made, the selection stays as it was.
+    CommonI::RefCountPtr<VnI::ITreeNode> node;
+    CommonI::RefCountPtr<VnI::ITreeNodeItr> children;
+    if (withChildren) {
+        node = holder->GetParentTreeNode();
+        if (node) {
+            children = node->GetChildren();
         }
     }
-    if (withChildren) {
-        if (auto node = holder->GetParentTreeNode()) {
-            auto children = node->GetChildren();
-            for (; children && !children->IsEnd(); children->Next()) {
-                const auto child = children->CurrentItem();
-                if (VnI::IPropertyHolder* below = child ? child->GetDataRef() : nullptr) {
-                    RemoveSelectedItem(below, false);
-                }
-            }
+    m_imp->Unselect(holder);
+    for (; children && !children->IsEnd(); children->Next()) {
+        const auto child = children->CurrentItem();
+        if (VnI::IPropertyHolder* below = child ? child->GetDataRef() : nullptr) {
+            m_imp->Unselect(below);
         }
     }
     return 1;

@@ -139,7 +139,9 @@ TEST(GenericPropertyHolder, EachHolderGrowsAListOfItsOwn) {
 
     second.AddProperty("Other", Int(1));
     second.AddProperty("Note", Int(2));
-    EXPECT_EQ(second.GetPropertyByName("Note")->GetIndex(), 1);
+    const auto secondNote = second.GetPropertyByName("Note");
+    ASSERT_TRUE(secondNote);
+    EXPECT_EQ(secondNote->GetIndex(), 1);
     EXPECT_EQ(first.GetPropertyNames()->GetNumNames(), 1);
     EXPECT_NE(first.GetPropertyNames(), second.GetPropertyNames());
 }
@@ -153,7 +155,9 @@ TEST(GenericPropertyHolder, TakesAtMost128Names) {
     }
     EXPECT_EQ(holder.AddProperty("N128", Int(128)), 0);
     EXPECT_EQ(holder.GetNumProperties(), 128);
-    EXPECT_EQ(holder.GetPropertyByName("N127")->GetIndex(), 127);
+    const auto last = holder.GetPropertyByName("N127");
+    ASSERT_TRUE(last);
+    EXPECT_EQ(last->GetIndex(), 127);
 }
 
 namespace {

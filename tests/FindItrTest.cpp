@@ -68,6 +68,10 @@ private:
 
 std::vector<IPropertyHolder*> Yielded(const RefCountPtr<IPropertyHolderItr>& it) {
     std::vector<IPropertyHolder*> out;
+    if (!it) {
+        ADD_FAILURE() << "no iterator where one was expected";
+        return out;
+    }
     for (; !it->IsEnd(); it->Next()) {
         out.push_back(it->CurrentItem());
     }

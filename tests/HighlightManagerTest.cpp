@@ -11,6 +11,7 @@
 #include <memory>
 #include <numeric>
 #include <random>
+#include <type_traits>
 #include <vector>
 
 using CommonI::RefCountPtr;
@@ -21,6 +22,10 @@ namespace {
 
 std::vector<VnI::IDeviceResource*> Walk(const RefCountPtr<VnI::IDeviceResourceItr>& it) {
     std::vector<VnI::IDeviceResource*> out;
+    if (!it) {
+        ADD_FAILURE() << "no iterator where one was expected";
+        return out;
+    }
     for (it->First(); !it->IsEnd(); it->Next()) {
         out.push_back(it->CurrentItem());
     }
@@ -80,7 +85,7 @@ TEST(HighlightManager, RemoveAllAndDestructionClearEveryFlag) {
         manager.AddHighlightedItem(&c);
         EXPECT_EQ(manager.RemoveAll(), 1);
         EXPECT_FALSE(a.IsHighlighted() || b.IsHighlighted() || c.IsHighlighted());
-        EXPECT_TRUE(manager.GetHighlightedItems()->IsEnd());
+        EXPECT_TRUE(Walk(manager.GetHighlightedItems()).empty());
         EXPECT_EQ(manager.RemoveAll(), 1);
         manager.AddHighlightedItem(&kept);
         manager.RemoveHighlightedItem(&a); // the index was cleared too: nothing happens
@@ -123,7 +128,7 @@ TEST(HighlightManager, AnswersItsInterfaceAndForwardsThroughIt) {
     EXPECT_FALSE(a.IsHighlighted());
     iface->AddHighlightedItem(&a);
     iface->RemoveAll();
-    EXPECT_TRUE(iface->GetHighlightedItems()->IsEnd());
+    EXPECT_TRUE(Walk(iface->GetHighlightedItems()).empty());
 }
 
 TEST(HighlightManager, SlotOrderIsTheContract) {
@@ -151,13 +156,47 @@ TEST(HighlightManagerScale, AMillionResourcesRemovedInAnotherOrderStayQuick) {
     for (int i : order) {
         manager.RemoveHighlightedItem(resources[static_cast<size_t>(i)].get());
     }
-    EXPECT_TRUE(manager.GetHighlightedItems()->IsEnd());
+    EXPECT_TRUE(Walk(manager.GetHighlightedItems()).empty());
     EXPECT_FALSE(resources[42]->IsHighlighted());
+}
+
+TEST(ListIterators, SlotOrdersAreTheContract) {
+    using VnI::IDeviceResourceItr;
+    using VnI::IPropertyHolderItr;
+    using VnTest::SlotOf;
+    EXPECT_EQ(SlotOf(&IPropertyHolderItr::GetInterface), 0);
+    EXPECT_EQ(SlotOf(&IPropertyHolderItr::CurrentItem), 3);
+    EXPECT_EQ(SlotOf(&IPropertyHolderItr::First), 4);
+    EXPECT_EQ(SlotOf(&IPropertyHolderItr::Next), 5);
+    EXPECT_EQ(SlotOf(&IPropertyHolderItr::IsEnd), 6);
+    EXPECT_EQ(SlotOf(&IDeviceResourceItr::GetInterface), 0);
+    EXPECT_EQ(SlotOf(&IDeviceResourceItr::CurrentItem), 3);
+    EXPECT_EQ(SlotOf(&IDeviceResourceItr::First), 4);
+    EXPECT_EQ(SlotOf(&IDeviceResourceItr::Next), 5);
+    EXPECT_EQ(SlotOf(&IDeviceResourceItr::IsEnd), 6);
+    // The classes fill exactly those slots and add nothing virtual but their destructors.
+    using Vn::Eng::DeviceResourceItr;
+    using Vn::Eng::PropertyHolderItr;
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::GetInterface), 0);
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::CurrentItem), 3);
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::First), 4);
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::Next), 5);
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::IsEnd), 6);
+    EXPECT_EQ(SlotOf(&PropertyHolderItr::Dump), -1);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::GetInterface), 0);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::CurrentItem), 3);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::First), 4);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::Next), 5);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::IsEnd), 6);
+    EXPECT_EQ(SlotOf(&DeviceResourceItr::Dump), -1);
+    EXPECT_TRUE(std::has_virtual_destructor_v<PropertyHolderItr>);
+    EXPECT_TRUE(std::has_virtual_destructor_v<DeviceResourceItr>);
 }
 
 TEST(ListIterators, WalkTheirListInPlace) {
     Vn::Eng::PropertyHolderList holders;
     auto it = Vn::Eng::PropertyHolderItr::CreateInstance(&holders);
+    ASSERT_TRUE(it);
     EXPECT_TRUE(it->IsEnd());
     EXPECT_EQ(it->First(), 1);
     EXPECT_EQ(it->Next(), 1);
@@ -176,16 +215,19 @@ TEST(ListIterators, WalkTheirListInPlace) {
     EXPECT_TRUE(it->IsEnd());
 
     auto none = Vn::Eng::PropertyHolderItr::CreateInstance(nullptr);
+    ASSERT_TRUE(none);
     EXPECT_TRUE(none->IsEnd());
     EXPECT_EQ(none->First(), 1);
     EXPECT_EQ(none->CurrentItem(), nullptr);
     auto noResources = Vn::Eng::DeviceResourceItr::CreateInstance(nullptr);
+    ASSERT_TRUE(noResources);
     EXPECT_TRUE(noResources->IsEnd());
 }
 
 TEST(ListIterators, AnswerTheirInterfacesAndCount) {
     Vn::Eng::DeviceResourceList list;
     auto it = Vn::Eng::DeviceResourceItr::CreateInstance(&list);
+    ASSERT_TRUE(it);
     CitI::IInterface* counter = it->GetInterface(CommonI::IID_IRefCount);
     ASSERT_NE(counter, nullptr);
     EXPECT_NE(counter, static_cast<CitI::IInterface*>(it.Get()));

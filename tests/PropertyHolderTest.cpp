@@ -76,12 +76,16 @@ TEST(PropertyHolder, StoresUnderANewNameAndAppendsItToTheList) {
     EXPECT_EQ(pin.AddProperty("Site", Text("A3"), true), 1);
     EXPECT_EQ(schema.GetNumNames(), 2);
     EXPECT_EQ(schema.Contains("Bank"), 0);
+    ASSERT_NE(schema.GetPropertyName(0), nullptr);
+    ASSERT_NE(schema.GetPropertyName(1), nullptr);
     EXPECT_EQ(schema.GetPropertyName(0)->GetType(), VnI::INT_TYPE);
     EXPECT_FALSE(schema.GetPropertyName(0)->IsVisible());
     EXPECT_EQ(schema.GetPropertyName(1)->GetType(), VnI::STRING_TYPE);
     EXPECT_TRUE(schema.GetPropertyName(1)->IsVisible());
     EXPECT_EQ(bank->GetIndex(), 0);
-    EXPECT_EQ(pin.GetPropertyByName("Site")->GetIndex(), 1);
+    const auto site = pin.GetPropertyByName("Site");
+    ASSERT_TRUE(site);
+    EXPECT_EQ(site->GetIndex(), 1);
     EXPECT_EQ(pin.GetNumProperties(), 2);
     EXPECT_EQ(pin.GetPropertyByName("Bank").Get(), bank.Get());
     EXPECT_EQ(CountOf(bank.Get()), 2);
@@ -116,6 +120,7 @@ TEST(PropertyHolder, ReplacingKeepsTheCountAndRetiresTheOldProperty) {
     EXPECT_EQ(CountOf(first.Get()), 1) << "the holder let go of it";
     EXPECT_EQ(second->GetIndex(), 0);
     EXPECT_EQ(pin.GetNumProperties(), 1);
+    ASSERT_NE(schema.GetPropertyName(0), nullptr);
     EXPECT_TRUE(schema.GetPropertyName(0)->IsVisible()) << "visibility is the first add's";
     EXPECT_EQ(pin.GetPropertyByName("Bank").Get(), second.Get());
 
@@ -152,6 +157,8 @@ TEST(PropertyHolder, TheShortAddIsVisibleAndTheLongOneKeepsItsFlag) {
     Pin pin(&schema);
     pin.AddProperty("Shown", Int(1));
     pin.AddProperty("Hidden", Int(2), false);
+    ASSERT_NE(schema.GetPropertyName(0), nullptr);
+    ASSERT_NE(schema.GetPropertyName(1), nullptr);
     EXPECT_TRUE(schema.GetPropertyName(0)->IsVisible());
     EXPECT_FALSE(schema.GetPropertyName(1)->IsVisible());
 }
@@ -190,7 +197,9 @@ TEST(PropertyHolder, HoldersSharingAListKeepTheirOwnSlots) {
     second.AddProperty("Site", site);
     EXPECT_EQ(second.GetPropertyByName("Site").Get(), site.Get());
     EXPECT_EQ(site->GetIndex(), 1);
-    EXPECT_EQ(first.GetPropertyByName("Site")->GetStringProperty(), StringBase<char>("A3"));
+    const auto firstSite = first.GetPropertyByName("Site");
+    ASSERT_TRUE(firstSite);
+    EXPECT_EQ(firstSite->GetStringProperty(), StringBase<char>("A3"));
 }
 
 TEST(PropertyHolder, SlotsFollowTheNameListsLengthAsItGrows) {
@@ -206,7 +215,9 @@ TEST(PropertyHolder, SlotsFollowTheNameListsLengthAsItGrows) {
     }
     EXPECT_EQ(DumpedSlots(pin), 17);
     EXPECT_EQ(pin.GetNumProperties(), 15);
-    EXPECT_EQ(pin.GetPropertyByName("N16")->GetIndex(), 16);
+    const auto n16 = pin.GetPropertyByName("N16");
+    ASSERT_TRUE(n16);
+    EXPECT_EQ(n16->GetIndex(), 16);
 }
 
 TEST(PropertyHolder, RefusesNamesBeyondWhatAnIndexCanHold) {

@@ -80,7 +80,9 @@ TEST(PropertyName, ReportsWhatItWasCreatedWith) {
     EXPECT_EQ(bank->GetName(), Port::StringBase<char>("Bank"));
     EXPECT_EQ(bank->GetType(), VnI::INT_TYPE);
     EXPECT_FALSE(bank->IsVisible());
-    EXPECT_TRUE(bank->GetPossibleValues()->IsEnd());
+    const auto bankValues = bank->GetPossibleValues();
+    ASSERT_TRUE(bankValues);
+    EXPECT_TRUE(bankValues->IsEnd());
     EXPECT_EQ(CountOf(bank.Get()), 1);
 }
 
@@ -138,18 +140,21 @@ TEST_F(BankAndPin, GivesPositionsInInsertionOrderAndRejectsDuplicates) {
     EXPECT_EQ(api.AddName("Bank", VnI::STRING_TYPE, false), -1);
     EXPECT_EQ(api.GetNumNames(), 2);
     EXPECT_EQ(VisibleNames(), 1) << "a rejected name is not counted";
+    ASSERT_NE(api.GetPropertyName(0), nullptr);
     EXPECT_EQ(api.GetPropertyName(0)->GetType(), VnI::INT_TYPE) << "the first name keeps its type";
     EXPECT_TRUE(api.GetPropertyName(0)->IsVisible());
 
     EXPECT_EQ(
         api.AddEnumName("Pin", VnI::ENUM_TYPE, PossibleEnumValuesItr::CreateInstance(&kAbc), true),
         -1);
+    ASSERT_NE(api.GetPropertyName(1), nullptr);
     EXPECT_TRUE(api.GetPropertyName(1)->GetPossibleValues()->IsEnd())
         << "the first name keeps its values";
 
     EXPECT_EQ(
         api.AddEnumName("Io", VnI::ENUM_TYPE, PossibleEnumValuesItr::CreateInstance(&kAbc), true),
         2);
+    ASSERT_NE(api.GetPropertyName(2), nullptr);
     EXPECT_EQ(Values(api.GetPropertyName(2)->GetPossibleValues()),
               (std::vector<std::string>{"A", "B", "C"}));
     EXPECT_EQ(VisibleNames(), 2);
@@ -226,9 +231,11 @@ TEST_F(BankAndPin, AppendsOnlyTheNamesItLacksAsCopies) {
 
     EXPECT_EQ(api.AppendList(&from), 1);
     EXPECT_EQ(Names(api), (std::vector<std::string>{"Bank", "Pin", "Site"}));
+    ASSERT_NE(api.GetPropertyName(1), nullptr);
     EXPECT_EQ(api.GetPropertyName(1)->GetType(), VnI::STRING_TYPE)
         << "a present name is skipped whatever its type";
     IPropertyName* site = api.GetPropertyName(2);
+    ASSERT_NE(site, nullptr);
     EXPECT_EQ(site->GetType(), VnI::ENUM_TYPE);
     EXPECT_FALSE(site->IsVisible());
     EXPECT_EQ(Values(site->GetPossibleValues()), (std::vector<std::string>{"A", "B", "C"}));

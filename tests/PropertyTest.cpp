@@ -47,6 +47,10 @@ RefCountPtr<IColorProperty> Adopt(IColorProperty* raw) {
 
 std::vector<std::string> Walk(const RefCountPtr<IPossibleEnumValuesItr>& it) {
     std::vector<std::string> out;
+    if (!it) {
+        ADD_FAILURE() << "no iterator where one was expected";
+        return out;
+    }
     for (it->First(); !it->IsEnd(); it->Next()) {
         out.push_back(it->CurrentItem().str());
     }
@@ -352,10 +356,33 @@ TEST_P(BothFactories, ColoursComeBackAsTheirColourInterface) {
     EXPECT_EQ(raw->GetInterface(VnI::IID_IColorProperty), static_cast<CitI::IInterface*>(raw))
         << "the IProperty handed out is the colour sub-object itself";
     const auto color = CommonI::QueryInterface<IColorProperty>(raw);
+    ASSERT_TRUE(color);
     EXPECT_FALSE(color->IsValid());
     EXPECT_EQ(color->GetRed(), 255);
     EXPECT_EQ(color->GetGreen(), 255);
     EXPECT_EQ(color->GetBlue(), 255);
+}
+
+TEST_P(BothFactories, ColourComponentsKeepTheirPlacesAndFullByteRange) {
+    // Three different values per colour, so that no two components can be swapped
+    // unnoticed; chars are signed here, so values above 127 arrive negative.
+    const int cases[][3] = {{1, 2, 3}, {200, 10, 130}, {0, 255, 128}, {127, 128, 129}};
+    for (const auto& c : cases) {
+        SCOPED_TRACE(testing::Message() << c[0] << "," << c[1] << "," << c[2]);
+        const auto held = Adopt(
+            Color(static_cast<char>(c[0]), static_cast<char>(c[1]), static_cast<char>(c[2]), true));
+        ASSERT_TRUE(held);
+        const auto color = CommonI::QueryInterface<IColorProperty>(held.Get());
+        ASSERT_TRUE(color);
+        EXPECT_EQ(color->GetRed(), c[0]);
+        EXPECT_EQ(color->GetGreen(), c[1]);
+        EXPECT_EQ(color->GetBlue(), c[2]);
+        EXPECT_TRUE(color->IsValid());
+        // The packed form of the same colour is equal to it.
+        const auto packed = Adopt(Color((c[0] << 16) | (c[1] << 8) | c[2], true));
+        ASSERT_TRUE(packed);
+        EXPECT_TRUE(held->Equals(RefCountPtr<const IProperty>(packed.Get()), 0));
+    }
 }
 
 TEST_P(BothFactories, EnumerationsStartOnTheAskedOrTheFirstValue) {
@@ -461,7 +488,9 @@ TEST(EnumeratedProperty, OverAnEmptyListIsEmptyAndRejectsEverything) {
     AsEnum(p).SetCurrentValue(Port::StringBase<char>("A"));
     EXPECT_EQ(capture.Debug(), std::vector<std::string>(3, kInvalid));
     EXPECT_TRUE(IsAt(p, "", 0));
-    EXPECT_TRUE(p->GetPossibleValues()->IsEnd());
+    const auto values = p->GetPossibleValues();
+    ASSERT_TRUE(values);
+    EXPECT_TRUE(values->IsEnd());
 
     capture.Clear();
     const auto asked = Adopt(PropertyFactory::CreateEnumProperty(none, "A", true));

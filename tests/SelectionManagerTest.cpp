@@ -22,6 +22,10 @@ namespace {
 
 std::vector<VnI::IPropertyHolder*> Walk(const RefCountPtr<VnI::IPropertyHolderItr>& it) {
     std::vector<VnI::IPropertyHolder*> out;
+    if (!it) {
+        ADD_FAILURE() << "no iterator where one was expected";
+        return out;
+    }
     for (it->First(); !it->IsEnd(); it->Next()) {
         out.push_back(it->CurrentItem());
     }
@@ -54,7 +58,7 @@ TEST(SelectionManager, StartsWithTwelveEmptyCategories) {
     }
     EXPECT_FALSE(manager.GetSelectedItems(12));
     EXPECT_FALSE(manager.GetSelectedItems(-1));
-    EXPECT_TRUE(manager.GetAllSelectedItems()->IsEnd());
+    EXPECT_TRUE(Walk(manager.GetAllSelectedItems()).empty());
 }
 
 TEST(SelectionManager, GrowsCategoriesForHigherTypesAndFilesByType) {
@@ -64,13 +68,46 @@ TEST(SelectionManager, GrowsCategoriesForHigherTypesAndFilesByType) {
     manager.AddSelectedItem(&low, false);
     EXPECT_EQ(manager.GetNumCategories(), 16);
     for (int c = 12; c < 15; ++c) {
-        EXPECT_TRUE(manager.GetSelectedItems(c)->IsEnd()) << c;
+        EXPECT_TRUE(Walk(manager.GetSelectedItems(c)).empty()) << c;
     }
     EXPECT_EQ(Walk(manager.GetSelectedItems(15)), std::vector<VnI::IPropertyHolder*>{&high});
     EXPECT_EQ(Walk(manager.GetSelectedItems(2)), std::vector<VnI::IPropertyHolder*>{&low});
     EXPECT_EQ(Walk(manager.GetAllSelectedItems()),
               (std::vector<VnI::IPropertyHolder*>{&high, &low}));
     EXPECT_TRUE(high.IsSelected());
+}
+
+TEST(SelectionManager, TypesUpToTheCategoryBoundAreFiledAndTheBoundItselfRefused) {
+    constexpr int kBound = SelectionManager::kMaxCategories;
+    VnTest::MessageCapture capture;
+    FakeHolder last(kBound - 1, "last"), at(kBound, "at"), beyond(kBound + 1, "beyond");
+    SelectionManager manager;
+
+    EXPECT_EQ(manager.AddSelectedItem(&at, false), 1);
+    EXPECT_EQ(manager.AddSelectedItem(&beyond, false), 1);
+    EXPECT_FALSE(at.IsSelected());
+    EXPECT_FALSE(beyond.IsSelected());
+    EXPECT_EQ(manager.GetNumCategories(), 12);
+    EXPECT_EQ(capture.Debug().size(), 2u);
+    EXPECT_TRUE(Walk(manager.GetAllSelectedItems()).empty());
+
+    capture.Clear();
+    EXPECT_EQ(manager.AddSelectedItem(&last, false), 1);
+    EXPECT_TRUE(last.IsSelected());
+    EXPECT_TRUE(capture.Debug().empty());
+    EXPECT_EQ(manager.GetNumCategories(), kBound);
+    EXPECT_EQ(Walk(manager.GetSelectedItems(kBound - 1)),
+              std::vector<VnI::IPropertyHolder*>{&last});
+    EXPECT_FALSE(manager.GetSelectedItems(kBound));
+    EXPECT_EQ(Walk(manager.GetAllSelectedItems()), std::vector<VnI::IPropertyHolder*>{&last});
+
+    // Once the categories reach the bound, the bound is still refused.
+    EXPECT_EQ(manager.AddSelectedItem(&at, false), 1);
+    EXPECT_FALSE(at.IsSelected());
+    EXPECT_EQ(manager.GetNumCategories(), kBound);
+    manager.RemoveSelectedItem(&last, false);
+    EXPECT_FALSE(last.IsSelected());
+    EXPECT_TRUE(Walk(manager.GetSelectedItems(kBound - 1)).empty());
 }
 
 TEST(SelectionManager, SelectsOnceAndRespectsAFlagSetByHand) {
@@ -202,10 +239,10 @@ TEST(SelectionManager, RemoveAllClearsListsAndFlagsButKeepsCategories) {
     EXPECT_FALSE(a.IsSelected());
     EXPECT_FALSE(b.IsSelected());
     EXPECT_EQ(manager.GetNumCategories(), 21);
-    EXPECT_TRUE(manager.GetAllSelectedItems()->IsEnd());
+    EXPECT_TRUE(Walk(manager.GetAllSelectedItems()).empty());
     manager.AddSelectedItem(&a, false); // the index was cleared with the lists
     manager.RemoveSelectedItem(&a, false);
-    EXPECT_TRUE(manager.GetAllSelectedItems()->IsEnd());
+    EXPECT_TRUE(Walk(manager.GetAllSelectedItems()).empty());
 }
 
 TEST(SelectionManager, DestructionClearsTheFlagsOfWhatIsStillSelected) {
@@ -238,7 +275,7 @@ TEST(SelectionManager, AnswersItsInterfaceAndForwardsThroughIt) {
     EXPECT_FALSE(h.IsSelected());
     iface->AddSelectedItem(&h, false);
     iface->RemoveAll();
-    EXPECT_TRUE(iface->GetAllSelectedItems()->IsEnd());
+    EXPECT_TRUE(Walk(iface->GetAllSelectedItems()).empty());
 }
 
 TEST(SelectionManager, SlotOrderIsTheContract) {

@@ -36,6 +36,12 @@ public:
         if (found >= 0) {
             return m_entries[static_cast<std::size_t>(found)].second;
         }
+        // Room first, so that once the index holds the name the entry cannot fail to
+        // follow it (moving the name in does not allocate); a failure leaves both
+        // structures and the caller's name as they were.
+        if (m_entries.size() == m_entries.capacity()) {
+            m_entries.reserve(m_entries.empty() ? 16 : m_entries.size() * 2);
+        }
         m_index.Append(name.view());
         return m_entries.emplace_back(std::move(name), Color()).second;
     }

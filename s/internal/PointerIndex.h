@@ -79,6 +79,17 @@ public:
         m_size = 0;
     }
 
+    /// The number of slots: 0 before the first key, then 64, doubling whenever a key
+    /// would make the table more than half full.
+    std::size_t Capacity() const { return m_slots.size(); }
+    /// The slot where probing for key begins in a table of capacity slots (a power of
+    /// two), so that tests can choose keys that collide.
+    static std::size_t HomeIn(const Key* key, std::size_t capacity) {
+        // Addresses are aligned and allocated in runs: a multiplicative mix spreads them.
+        const auto bits = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(key));
+        return static_cast<std::size_t>((bits * 0x9E3779B97F4A7C15ull) >> 20) & (capacity - 1);
+    }
+
 private:
     struct Slot {
         const Key* key = nullptr;
@@ -86,11 +97,7 @@ private:
     };
 
     std::size_t Mask() const { return m_slots.size() - 1; }
-    // Addresses are aligned and allocated in runs: a multiplicative mix spreads them.
-    std::size_t Home(const Key* key) const {
-        const auto bits = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(key));
-        return static_cast<std::size_t>((bits * 0x9E3779B97F4A7C15ull) >> 20) & Mask();
-    }
+    std::size_t Home(const Key* key) const { return HomeIn(key, m_slots.size()); }
 
     void Rehash(std::size_t capacity) {
         std::vector<Slot> old(capacity);

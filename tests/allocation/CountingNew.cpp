@@ -7,10 +7,21 @@
 
 namespace {
 thread_local long t_allocations = 0;
-}
+thread_local long t_failAt = 0; // the count at which to fail; 0: never
+thread_local bool t_failed = false;
+} // namespace
 
 long VnTest::AllocationCount() {
     return t_allocations;
+}
+
+void VnTest::FailAllocation(long n) {
+    t_failAt = n > 0 ? t_allocations + n : 0;
+    t_failed = false;
+}
+
+bool VnTest::AllocationFailed() {
+    return t_failed;
 }
 
 // Default visibility: the library's own calls to operator new must land here too. Every
@@ -20,6 +31,11 @@ long VnTest::AllocationCount() {
 
 VN_REPLACED void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
     ++t_allocations;
+    if (t_allocations == t_failAt) {
+        t_failAt = 0;
+        t_failed = true;
+        return nullptr;
+    }
     return std::malloc(size != 0 ? size : 1);
 }
 VN_REPLACED void* operator new(std::size_t size) {

@@ -1,0 +1,172 @@
+// The managers' address index on its own: keys are chosen by their home slot, so runs of
+// colliding keys, and runs that wrap from the table's last slot to its first, are built
+// on purpose rather than hoped for among a million addresses.
+#include "s/internal/PointerIndex.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <map>
+#include <random>
+#include <vector>
+
+namespace {
+
+using Index = Vn::Eng::detail::PointerIndex<int, int>;
+constexpr std::size_t kCapacity = 64; // the first table; it holds up to 32 keys
+
+// Addresses of a pool, filed by the home slot the index computes for them.
+class KeysByHome {
+public:
+    KeysByHome() : m_pool(1 << 14), m_byHome(kCapacity) {
+        for (const int& x : m_pool) {
+            m_byHome[Index::HomeIn(&x, kCapacity)].push_back(&x);
+        }
+    }
+    /// A key not handed out before whose home is home.
+    const int* Take(std::size_t home) {
+        std::vector<const int*>& keys = m_byHome[home];
+        EXPECT_FALSE(keys.empty()) << "no key left with home " << home;
+        if (keys.empty()) {
+            return nullptr;
+        }
+        const int* key = keys.back();
+        keys.pop_back();
+        return key;
+    }
+
+private:
+    std::vector<int> m_pool;
+    std::vector<std::vector<const int*>> m_byHome;
+};
+
+// Every key of the model is found with its value; every key of gone is not found.
+void ExpectHolds(Index& index, const std::map<const int*, int>& model,
+                 const std::vector<const int*>& gone) {
+    ASSERT_EQ(index.Capacity(), kCapacity) << "the table grew: collisions were not tested";
+    for (const auto& [key, value] : model) {
+        const int* found = index.Find(key);
+        ASSERT_NE(found, nullptr) << "key " << key << " with home " << Index::HomeIn(key, kCapacity)
+                                  << " is unreachable";
+        EXPECT_EQ(*found, value);
+    }
+    for (const int* key : gone) {
+        EXPECT_EQ(index.Find(key), nullptr) << "erased key " << key << " is still found";
+    }
+}
+
+// Adds keys with the given homes, in order, valued 1, 2, 3, ...
+std::vector<const int*> AddWithHomes(Index& index, KeysByHome& keys,
+                                     std::map<const int*, int>& model,
+                                     const std::vector<std::size_t>& homes) {
+    std::vector<const int*> added;
+    for (std::size_t home : homes) {
+        const int* key = keys.Take(home);
+        const int value = static_cast<int>(model.size()) + 1;
+        index.FindOrAdd(key) = value;
+        model[key] = value;
+        added.push_back(key);
+    }
+    return added;
+}
+
+} // namespace
+
+TEST(PointerIndex, StartsEmptyAndAddsEachKeyOnce) {
+    KeysByHome keys;
+    Index index;
+    EXPECT_EQ(index.Capacity(), 0u);
+    const int* a = keys.Take(5);
+    EXPECT_EQ(index.Find(a), nullptr);
+    index.FindOrAdd(a) = 7;
+    EXPECT_EQ(index.Capacity(), kCapacity);
+    index.FindOrAdd(a) += 1; // found, not added again
+    ASSERT_NE(index.Find(a), nullptr);
+    EXPECT_EQ(*index.Find(a), 8);
+    index.Erase(a);
+    EXPECT_EQ(index.Find(a), nullptr);
+    index.FindOrAdd(a) = 1;
+    index.Clear();
+    EXPECT_EQ(index.Find(a), nullptr);
+}
+
+TEST(PointerIndex, ErasingFromARunMovesLaterKeysBackButNotBeforeTheirHomes) {
+    KeysByHome keys;
+    Index index;
+    std::map<const int*, int> model;
+    // Slots 10 to 14: a, b, c (home 10), d (home 11), e (home 13). Erasing a must move
+    // b, c and d back one slot each, while e may move only as far as its home.
+    const auto k = AddWithHomes(index, keys, model, {10, 10, 10, 11, 13, 20});
+    std::vector<const int*> gone;
+    for (const int* erased : {k[0], k[2], k[1], k[4], k[3], k[5]}) {
+        index.Erase(erased);
+        model.erase(erased);
+        gone.push_back(erased);
+        SCOPED_TRACE(gone.size());
+        ExpectHolds(index, model, gone);
+    }
+}
+
+TEST(PointerIndex, RunsWrapFromTheLastSlotToTheFirst) {
+    KeysByHome keys;
+    Index index;
+    std::map<const int*, int> model;
+    // Slots 62 to 4 across the end: a (home 62), b (63), c (0), d and e (62), f (2),
+    // g (4). Erasing a leaves b and c at their homes, on both sides of the end, and brings
+    // d and e back across it; f moves back to its home, g stays.
+    const auto k = AddWithHomes(index, keys, model, {62, 63, 0, 62, 62, 2, 4});
+    std::vector<const int*> gone;
+    for (const int* erased : {k[0], k[3], k[1], k[5], k[2], k[4], k[6]}) {
+        index.Erase(erased);
+        model.erase(erased);
+        gone.push_back(erased);
+        SCOPED_TRACE(gone.size());
+        ExpectHolds(index, model, gone);
+    }
+}
+
+TEST(PointerIndex, RandomChurnAroundTheWrapKeepsEveryKeyReachable) {
+    KeysByHome keys;
+    const std::vector<std::size_t> homes{60, 61, 62, 63, 0, 1, 2, 3};
+    std::vector<const int*> candidates; // 3 per home: up to 24 keys, the table stays 64
+    for (std::size_t home : homes) {
+        for (int i = 0; i < 3; ++i) {
+            candidates.push_back(keys.Take(home));
+        }
+    }
+    std::mt19937 random(1234);
+    for (int round = 0; round < 200; ++round) {
+        SCOPED_TRACE(round);
+        Index index;
+        std::map<const int*, int> model;
+        std::vector<const int*> order = candidates;
+        std::shuffle(order.begin(), order.end(), random);
+        for (const int* key : order) {
+            const int value = static_cast<int>(model.size()) + 100;
+            index.FindOrAdd(key) = value;
+            model[key] = value;
+        }
+        std::shuffle(order.begin(), order.end(), random);
+        std::vector<const int*> gone;
+        for (std::size_t i = 0; i < order.size(); ++i) {
+            index.Erase(order[i]);
+            model.erase(order[i]);
+            gone.push_back(order[i]);
+            ExpectHolds(index, model, gone);
+            if (HasFatalFailure()) {
+                return;
+            }
+            // Now and then a key comes back, into whatever the shifts left.
+            if (i % 5 == 4) {
+                const int* back = gone[gone.size() / 2];
+                gone.erase(gone.begin() + static_cast<std::ptrdiff_t>(gone.size() / 2));
+                index.FindOrAdd(back) = -1;
+                model[back] = -1;
+                order.push_back(back);
+                ExpectHolds(index, model, gone);
+            }
+        }
+        EXPECT_TRUE(model.empty());
+    }
+}
