@@ -49,7 +49,7 @@ public:
         return 0;
     }
     VnI::IPropertyNameList* GetPropertyNames() override { return nullptr; }
-    int GetType() const override { return 7; }
+    int GetType() const override { return VnI::DEVICE_RESOURCE_HOLDER_TYPE; }
     Port::StringBase<char> GetTileName() const override { return {}; }
     std::int64_t GetLocation(int&, int&) const override { return 0; }
     Port::StringBase<char> GetSiteType() const override { return {}; }

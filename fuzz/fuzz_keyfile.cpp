@@ -59,7 +59,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     }
 
     PM_PIC part(nullptr, nullptr, nullptr);
-    PM_DEVKEY keys(path.c_str(), &part, 0, 1, 1);
+    PM_DEVKEY keys(path.c_str(), &part, PM_DEVKEY::kAbsentIsSilent, PM_DEVKEY::kSearchDataPath,
+                   PM_DEVKEY::kRejectionIsReported);
     const bool valid = keys.get_validity() != 0;
 
     // The first key-like run of the input, so that reads hit keys the file defines.

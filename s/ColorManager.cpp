@@ -8,6 +8,7 @@
 #include "devdata/PM_PIC.h"
 #include "s/PropertyFactory.h"
 #include "s/internal/ColorManagerImp.h"
+#include "s/internal/ColorSchemeSource.h"
 
 #include <cstddef>
 #include <exception>
@@ -116,7 +117,10 @@ void Load(ColorManagerImp& state) {
     Reset(state);
     const std::unique_ptr<PM_PIC> part = std::make_unique<PM_PIC>(nullptr, nullptr, nullptr);
     // Declared after the part so that it goes first when loading ends.
-    const auto keys = std::make_unique<PM_DEVKEY>(kSchemeFile, part.get(), 0, 1, 1);
+    const auto keys =
+        std::make_unique<PM_DEVKEY>(kSchemeFile, part.get(), PM_DEVKEY::kAbsentIsSilent,
+                                    PM_DEVKEY::kSearchDataPath, PM_DEVKEY::kRejectionIsReported);
+    detail::LoadedColorSchemeSource() = {keys->GetPath().str(), keys->get_validity() != 0};
     if (keys->get_validity() == 0) {
         return;
     }

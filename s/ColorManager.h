@@ -78,8 +78,8 @@ public:
     /// 4000000000 gets a report instead of an exhausted heap.
     static constexpr unsigned int kMaxPaletteLength = 65536;
 
-    /// The state record, for tools that print the scheme and for tests; it always points
-    /// at the one record.
+    /// The state record, for the library's own units and white-box tests; it always
+    /// points at the one record. Programs that show the scheme read ColorScheme.
     static ColorManagerImp* const m_imp;
 };
 

@@ -48,7 +48,7 @@ CitI::IInterface* DeviceResource::GetInterface(const Port::XUID& id) {
 }
 
 int DeviceResource::GetType() const {
-    return 7;
+    return VnI::DEVICE_RESOURCE_HOLDER_TYPE;
 }
 
 bool DeviceResource::IsHighlighted() const {

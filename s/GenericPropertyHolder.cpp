@@ -39,7 +39,7 @@ VnI::IPropertyNameList* GenericPropertyHolder::GetPropertyNames() {
 }
 
 int GenericPropertyHolder::GetType() const {
-    return 11;
+    return VnI::GENERIC_HOLDER_TYPE;
 }
 
 } // namespace Vn::Eng

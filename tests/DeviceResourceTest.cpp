@@ -40,10 +40,13 @@ RefCountPtr<IProperty> Int(int value) {
 
 } // namespace
 
+// Hosts file and compare holders by these numbers; a renumbering breaks every host.
+static_assert(VnI::DEVICE_RESOURCE_HOLDER_TYPE == 7 && VnI::GENERIC_HOLDER_TYPE == 11);
+
 TEST(DeviceResource, IsAHolderOfTypeSevenAndStartsUnhighlighted) {
     Pad pad;
     VnI::IPropertyHolder* holder = &pad;
-    EXPECT_EQ(holder->GetType(), 7);
+    EXPECT_EQ(holder->GetType(), VnI::DEVICE_RESOURCE_HOLDER_TYPE);
     EXPECT_FALSE(pad.IsHighlighted());
     EXPECT_FALSE(pad.IsSelected());
     EXPECT_EQ(pad.GetNumProperties(), 0);
@@ -119,7 +122,7 @@ TEST(DeviceResource, SlotOrdersAreTheContract) {
 
 TEST(GenericPropertyHolder, StartsEmptyAndNamelessAsTypeEleven) {
     GenericPropertyHolder holder;
-    EXPECT_EQ(holder.GetType(), 11);
+    EXPECT_EQ(holder.GetType(), VnI::GENERIC_HOLDER_TYPE);
     EXPECT_EQ(holder.GetName(), StringBase<char>());
     EXPECT_EQ(holder.GetDisplayName(), StringBase<char>());
     ASSERT_NE(holder.GetPropertyNames(), nullptr);
@@ -173,12 +176,12 @@ public:
 
 TEST(GenericDataModel, AnswersEveryQuestionWithAnEmptyResult) {
     OneTypeModel model;
-    for (int type : {-1, 0, 7, 11}) {
+    for (int type : {-1, 0, VnI::DEVICE_RESOURCE_HOLDER_TYPE, VnI::GENERIC_HOLDER_TYPE}) {
         EXPECT_EQ(model.GetPropertyNames(type), nullptr);
         EXPECT_EQ(model.GetTypeName(type), StringBase<char>());
         EXPECT_EQ(model.Find(type, "Bank", Int(3), VnI::MATCH_ANY), nullptr);
     }
-    EXPECT_EQ(model.Find(7, "", nullptr, 0), nullptr);
+    EXPECT_EQ(model.Find(VnI::DEVICE_RESOURCE_HOLDER_TYPE, "", nullptr, 0), nullptr);
 }
 
 TEST(GenericDataModel, AnswersItsDataModelPartOnly) {

@@ -56,7 +56,7 @@ TEST(TypicalRoad, SelectHighlightColourAndFindAgainAmongTheSelection) {
         sites.push_back(
             std::make_unique<Site>(names, i == 0 ? "bank0" : "pin" + std::to_string(i)));
         Site& site = *sites.back();
-        EXPECT_EQ(site.GetType(), 7);
+        EXPECT_EQ(site.GetType(), VnI::DEVICE_RESOURCE_HOLDER_TYPE);
         site.AddProperty(Str("Name"), Adopt(Vn::Eng::PropertyFactory::CreateStringProperty(
                                           site.GetName(), true)));
         site.AddProperty(Str("X"),
@@ -79,7 +79,7 @@ TEST(TypicalRoad, SelectHighlightColourAndFindAgainAmongTheSelection) {
         for (auto& site : sites) {
             EXPECT_TRUE(site->IsSelected());
         }
-        auto inCategory = selection.GetSelectedItems(7);
+        auto inCategory = selection.GetSelectedItems(VnI::DEVICE_RESOURCE_HOLDER_TYPE);
         int filed = 0;
         for (; !inCategory->IsEnd(); inCategory->Next()) {
             ++filed;

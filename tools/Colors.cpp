@@ -8,9 +8,7 @@
 #include "Commands.h"
 #include "Svg.h"
 
-#include "devdata/PM_DEVKEY.h"
-#include "s/ColorManager.h"
-#include "s/internal/ColorManagerImp.h"
+#include "s/ColorScheme.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -23,32 +21,23 @@ namespace {
 
 const char kCommand[] = "colors";
 
-using Color = Vn::Eng::ColorManager::Color;
+using Vn::Eng::ColorScheme;
+using Swatch = ColorScheme::Swatch;
 
 struct Group {
     std::string title;
     bool counted; // a list, printed with its count
-    std::vector<std::pair<std::string, Color>> colors;
+    std::vector<std::pair<std::string, Swatch>> colors;
 };
 
-std::string Hex(const Color& color) {
-    if (!color) {
+std::string Hex(const Swatch& color) {
+    if (!color.present) {
         return "(none)";
     }
-    return HexColor(color->GetRed(), color->GetGreen(), color->GetBlue()) +
-           (color->IsValid() ? "" : " (not valid)");
+    return HexColor(color.red, color.green, color.blue) + (color.valid ? "" : " (not valid)");
 }
 
-Group Palette(const std::string& title, int count, Color (*get)(int, bool)) {
-    Group group{title, true, {}};
-    for (int i = 0; i < count; ++i) {
-        // The defaults, as read: the working palettes may have been recoloured or grown.
-        group.colors.emplace_back(std::to_string(i), get(i, true));
-    }
-    return group;
-}
-
-Group List(const std::string& title, const Vn::Eng::ColorManagerImp::ColorList& list) {
+Group List(const std::string& title, const std::vector<Swatch>& list) {
     Group group{title, true, {}};
     for (std::size_t i = 0; i < list.size(); ++i) {
         group.colors.emplace_back(std::to_string(i), list[i]);
@@ -57,29 +46,26 @@ Group List(const std::string& title, const Vn::Eng::ColorManagerImp::ColorList& 
 }
 
 std::vector<Group> Collect() {
-    using Vn::Eng::ColorManager;
-    const Vn::Eng::ColorManagerImp& state = *ColorManager::m_imp;
     std::vector<Group> groups;
     groups.push_back({"Single colours",
                       false,
-                      {{"tile", ColorManager::GetTileColor()},
-                       {"signal", ColorManager::GetSignalColor()},
-                       {"switch box", ColorManager::GetSwitchBoxColor()}}});
+                      {{"tile", ColorScheme::GetTileColor()},
+                       {"signal", ColorScheme::GetSignalColor()},
+                       {"switch box", ColorScheme::GetSwitchBoxColor()}}});
     Group types{"Tile types", true, {}};
-    for (const auto& [name, color] : state.m_tileTypeColors) {
-        types.colors.emplace_back(name.str(), color);
+    for (auto& type : ColorScheme::GetTileTypes()) {
+        types.colors.emplace_back(std::move(type.name), type.color);
     }
-    std::sort(types.colors.begin(), types.colors.end(),
-              [](const auto& a, const auto& b) { return a.first < b.first; });
     groups.push_back(std::move(types));
-    groups.push_back(List("Generic colours", state.m_genericColors));
-    groups.push_back(List("Selected-path colours", state.m_selectedPathColors));
-    groups.push_back(Palette("IO bank colours", ColorManager::GetNumDefaultIOBankColors(),
-                             &ColorManager::GetIOBankColor));
-    groups.push_back(Palette("Clock region colours", ColorManager::GetNumDefaultClkRgnColors(),
-                             &ColorManager::GetClockRegionColor));
-    groups.push_back(Palette("Flight-time colours", ColorManager::GetNumDefaultFltTimeColors(),
-                             &ColorManager::GetFlightTimeColor));
+    groups.push_back(List("Generic colours", ColorScheme::GetGenericColors()));
+    groups.push_back(List("Selected-path colours", ColorScheme::GetSelectedPathColors()));
+    // The defaults, as read: the working palettes may have been recoloured or grown.
+    groups.push_back(
+        List("IO bank colours", ColorScheme::GetDefaultPalette(ColorScheme::Palette::IOBank)));
+    groups.push_back(List("Clock region colours",
+                          ColorScheme::GetDefaultPalette(ColorScheme::Palette::ClockRegion)));
+    groups.push_back(List("Flight-time colours",
+                          ColorScheme::GetDefaultPalette(ColorScheme::Palette::FlightTime)));
     return groups;
 }
 
@@ -111,10 +97,9 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
             double row = y + static_cast<double>(i / 24) * (swatch + 8);
             // A missing colour is drawn crossed out rather than left out, so that the
             // swatches still count what the scheme lacks.
-            if (color) {
-                svg.Rect(x, row, swatch, swatch,
-                         HexColor(color->GetRed(), color->GetGreen(), color->GetBlue()), "swatch",
-                         name + " " + Hex(color));
+            if (color.present) {
+                svg.Rect(x, row, swatch, swatch, HexColor(color.red, color.green, color.blue),
+                         "swatch", name + " " + Hex(color));
             } else {
                 svg.Rect(x, row, swatch, swatch, "none", "swatch missing", name + " (none)",
                          "#c00000", 1.5);
@@ -138,16 +123,18 @@ int Run(const ParsedArgs& args) {
     if (args.Has("--svg") && args.Value("--svg").empty()) {
         return UsageError(kCommand, "--svg wants a file name");
     }
-    // The library read its scheme when it was loaded; the same search again names the
-    // file it found (silently: a rejection was reported at load already).
-    PM_DEVKEY keys("rareroded.acd", nullptr, 0, 1, 0);
+    const std::string path = ColorScheme::GetPath();
     std::string source;
-    if (keys.GetPath().GetLength() == 0) {
+    switch (ColorScheme::GetSource()) {
+    case ColorScheme::Source::Absent:
         source = "no rareroded.acd found; the library runs without colours";
-    } else if (keys.get_validity() == 0) {
-        source = keys.GetPath().str() + " was rejected; the library runs without colours";
-    } else {
-        source = "read from " + keys.GetPath().str();
+        break;
+    case ColorScheme::Source::Rejected:
+        source = path + " was rejected; the library runs without colours";
+        break;
+    case ColorScheme::Source::Read:
+        source = "read from " + path;
+        break;
     }
     std::printf("Colour scheme: %s\n", source.c_str());
     std::vector<Group> groups = Collect();

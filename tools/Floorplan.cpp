@@ -573,8 +573,8 @@ void Search(Model& m, const Options& options, const Ptr<VnI::IProperty>& wanted)
             ++highlighted;
         }
     }
-    std::printf("Selected: %d resources (category 7, pins below matched banks included)\n",
-                selected);
+    std::printf("Selected: %d resources (category %d, pins below matched banks included)\n",
+                selected, VnI::DEVICE_RESOURCE_HOLDER_TYPE);
     std::printf("Highlighted: %d pins\n", highlighted);
 }
 

@@ -18,6 +18,11 @@ namespace VnI {
 
 class ITreeNode;
 
+/// Holder types answered by IPropertyHolder::GetType. The selection manager files
+/// holders by this number and hosts compare against it, so the values are fixed.
+inline constexpr int DEVICE_RESOURCE_HOLDER_TYPE = 7;
+inline constexpr int GENERIC_HOLDER_TYPE = 11;
+
 class VN_INTERFACE IPropertyItr : public CitI::IInterface {
 public:
     static constexpr const Port::XUID& kIID = IID_IPropertyItr;
@@ -56,7 +61,7 @@ public:
     virtual std::int64_t SetSelected(bool selected) = 0;
     /// The holder's schema, borrowed; may be null.
     virtual IPropertyNameList* GetPropertyNames() = 0;
-    /// The holder type: 7 device resources, 11 generic holders, others the host's.
+    /// The holder type: DEVICE_RESOURCE_HOLDER_TYPE, GENERIC_HOLDER_TYPE, or a host's own.
     virtual int GetType() const = 0;
 };
 

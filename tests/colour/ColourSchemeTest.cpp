@@ -7,6 +7,7 @@
 #include "devdata/PM_DEVKEY.h"
 #include "devdata/PM_PIC.h"
 #include "s/ColorManager.h"
+#include "s/ColorScheme.h"
 #include "s/PropertyFactory.h"
 #include "s/internal/ColorManagerImp.h"
 
@@ -14,6 +15,7 @@
 
 #include <array>
 #include <cstdlib>
+#include <filesystem>
 #include <ostream>
 #include <set>
 #include <string>
@@ -101,7 +103,8 @@ class NoScheme : public ::testing::Test {
 protected:
     void SetUp() override {
         PM_PIC part(nullptr, nullptr, nullptr);
-        PM_DEVKEY keys("rareroded.acd", &part, 0, 1, 1);
+        PM_DEVKEY keys("rareroded.acd", &part, PM_DEVKEY::kAbsentIsSilent,
+                       PM_DEVKEY::kSearchDataPath, PM_DEVKEY::kRejectionIsReported);
         m_found = keys.get_validity() != 0;
         if (m_found && keys.GetPath() == VENLOMER_TEST_INSTALLED_SCHEME) {
             GTEST_SKIP() << "a scheme is installed at " << VENLOMER_TEST_INSTALLED_SCHEME;
@@ -181,7 +184,56 @@ TEST_F(NoScheme, FindsNoSchemeItCouldAccept) {
     EXPECT_FALSE(m_found) << "the registration points at a folder with a usable scheme";
 }
 
+TEST_F(NoScheme, TheViewSaysWhichFileWasRejectedOrThatNoneWasFound) {
+    // The registrations point the search at a folder that holds a malformed scheme or none.
+    const std::filesystem::path here = std::filesystem::path(std::getenv("VENLOMER_DATA_PATH"));
+    using Vn::Eng::ColorScheme;
+    if (std::filesystem::exists(here / "rareroded.acd")) {
+        EXPECT_EQ(ColorScheme::GetSource(), ColorScheme::Source::Rejected);
+        EXPECT_TRUE(std::filesystem::equivalent(ColorScheme::GetPath(), here / "rareroded.acd"));
+    } else {
+        EXPECT_EQ(ColorScheme::GetSource(), ColorScheme::Source::Absent);
+        EXPECT_EQ(ColorScheme::GetPath(), "");
+    }
+    EXPECT_FALSE(ColorScheme::GetTileColor().present);
+    EXPECT_TRUE(ColorScheme::GetTileTypes().empty());
+    EXPECT_TRUE(ColorScheme::GetDefaultPalette(ColorScheme::Palette::IOBank).empty());
+}
+
 // ---- a small scheme with every key ---------------------------------------------------
+
+TEST(SmallScheme, TheViewShowsTheFileAndItsValuesWithoutChangingAnything) {
+    using Vn::Eng::ColorScheme;
+    using Swatch = ColorScheme::Swatch;
+    EXPECT_EQ(ColorScheme::GetSource(), ColorScheme::Source::Read);
+    EXPECT_TRUE(std::filesystem::equivalent(
+        ColorScheme::GetPath(),
+        std::filesystem::path(std::getenv("VENLOMER_DATA_PATH")) / "rareroded.acd"));
+    EXPECT_EQ(ColorScheme::GetSwitchBoxColor(), (Swatch{true, true, 7, 8, 9}));
+
+    const auto types = ColorScheme::GetTileTypes();
+    ASSERT_EQ(types.size(), kTileNames.size());
+    for (std::size_t i = 1; i < types.size(); ++i) {
+        EXPECT_LT(types[i - 1].name, types[i].name) << "sorted by name";
+    }
+    for (const auto& type : types) {
+        const Color c = State().m_tileTypeColors.at(type.name.c_str());
+        EXPECT_EQ((Rgb{type.color.red, type.color.green, type.color.blue}), RgbOf(c)) << type.name;
+    }
+    EXPECT_EQ(ColorScheme::GetGenericColors().size(), 3u);
+    EXPECT_EQ(ColorScheme::GetSelectedPathColors().at(3), (Swatch{true, true, 40, 40, 40}));
+
+    // Looking allocates nothing: the next generic colour is still the first.
+    EXPECT_EQ(State().m_nextGenericColor, 0);
+    // The working side follows the callers' changes; the default side stays as read.
+    ColorManager::GetIOBankColor(0, false)->SetRGB(50, 60, 70);
+    EXPECT_EQ(ColorScheme::GetWorkingPalette(ColorScheme::Palette::IOBank).at(0),
+              (Swatch{true, true, 50, 60, 70}));
+    EXPECT_EQ(ColorScheme::GetDefaultPalette(ColorScheme::Palette::IOBank).at(0),
+              (Swatch{true, true, 1, 0, 0}));
+    EXPECT_EQ(ColorScheme::GetDefaultPalette(ColorScheme::Palette::FlightTime).size(), 3u);
+    EXPECT_EQ(ColorScheme::GetWorkingPalette(ColorScheme::Palette::ClockRegion).size(), 4u);
+}
 
 TEST(SmallScheme, ReadsEverySingleColourAndEveryTileKey) {
     EXPECT_EQ(RgbOf(ColorManager::GetTileColor()), (Rgb{1, 2, 3}));
@@ -473,7 +525,10 @@ TEST(PartialScheme, AnEmptyGenericListLeavesNewTileNamesUncoloured) {
 
 // The shipped file read directly, beside what the colour manager made of it.
 struct ShippedScheme : ::testing::Test {
-    ShippedScheme() : part(nullptr, nullptr, nullptr), keys("rareroded.acd", &part, 0, 1, 1) {}
+    ShippedScheme()
+        : part(nullptr, nullptr, nullptr),
+          keys("rareroded.acd", &part, PM_DEVKEY::kAbsentIsSilent, PM_DEVKEY::kSearchDataPath,
+               PM_DEVKEY::kRejectionIsReported) {}
     PM_PIC part;
     PM_DEVKEY keys;
 };

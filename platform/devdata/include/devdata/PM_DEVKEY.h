@@ -9,7 +9,8 @@
 //   IO_BANK_COLORS = 230,159,0 : 86,180,233 : 0,158,115
 //
 //   PM_PIC part(nullptr, nullptr, nullptr);
-//   PM_DEVKEY keys("rareroded.acd", &part, 0, 1, 1);
+//   PM_DEVKEY keys("rareroded.acd", &part, PM_DEVKEY::kAbsentIsSilent,
+//                  PM_DEVKEY::kSearchDataPath, PM_DEVKEY::kRejectionIsReported);
 //   if (keys.get_validity() != 0) {
 //       const char entrySep = ':', fieldSep = ',';
 //       short n = keys.GetMaxIndex("IO_BANK_COLORS", entrySep, fieldSep).first;   // 3
@@ -52,6 +53,18 @@ class PM_PIC;
 
 class VN_VISIBLE PM_DEVKEY {
 public:
+    // The constructor's three flag bytes, by parameter. Hosts pass the bytes themselves,
+    // so only 0 and non-zero are meaningful and the values stay as they are.
+    /// `required`: whether an absent file is reported.
+    static constexpr unsigned char kAbsentIsSilent = 0;
+    static constexpr unsigned char kAbsentIsReported = 1;
+    /// `search`: where a bare file name is looked for.
+    static constexpr unsigned char kOpenInCurrentDir = 0;
+    static constexpr unsigned char kSearchDataPath = 1;
+    /// `report`: whether a rejected or unreadable file is reported.
+    static constexpr unsigned char kRejectionIsSilent = 0;
+    static constexpr unsigned char kRejectionIsReported = 1;
+
     /// Reads the key file now; the object keeps its keys, not the file.
     /// \param part      names the part the keys are for; may be null. Key files of this
     ///                  library hold the same values for every part, so it is not read.
