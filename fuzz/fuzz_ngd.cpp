@@ -1,7 +1,8 @@
 //===-- fuzz/fuzz_ngd.cpp - arbitrary bytes as a netlist database ---------------===//
 //
 // Whatever a file handed over as an NGD holds, telling it apart, checking it and reading
-// it must neither crash nor leak: each either answers or throws the library's error.
+// it must neither crash nor leak nor write beside it: each either answers or throws the
+// library's error.
 // Every object a read hands out is walked so that bad records surface here and not in a
 // caller.
 //
@@ -35,13 +36,20 @@ const std::string& FuzzFile() {
     return path;
 }
 
+// A read model holds no duplicates: every name finds the object it belongs to.
 size_t Walk(Nmod_Model& model) {
     size_t seen = 0;
     for (auto designs = model.GetDesignMgr()->GetDesignItr(); !designs.IsEnd(); designs.Next()) {
         Nmod_Design* design = designs.Current();
+        if (model.GetDesignMgr()->GetDesignByName(design->GetName()) != design) {
+            std::abort();
+        }
         seen += std::string(design->GetName()).size();
         for (auto views = design->GetViewItr(); !views.IsEnd(); views.Next()) {
             Nmod_View* view = views.Current();
+            if (design->GetViewByName(view->GetName()) != view) {
+                std::abort();
+            }
             seen += view->GetNumProperties();
             if (const Nmod_Block* block = view->GetBlock()) {
                 seen += std::string(block->GetName()).size() + block->GetType();
@@ -86,6 +94,13 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
             std::abort();
         }
         (void)Walk(*model);
+    }
+    // Reading never writes beside the file, whatever its journal mode says.
+    std::error_code ignored;
+    if (std::filesystem::exists(path + "-wal", ignored) ||
+        std::filesystem::exists(path + "-shm", ignored) ||
+        std::filesystem::exists(path + "-journal", ignored)) {
+        std::abort();
     }
     return 0;
 }

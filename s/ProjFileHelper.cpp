@@ -269,8 +269,14 @@ bool ProjFileHelper::GetFilesFromHost(Port::StringBase<char>& projectFile,
         return false;
     }
 
-    // Both scans share the slot they do not deliver, so a netlist name met in the default
-    // view may end the second scan early; the delivered names do not depend on it.
+    // Both scans share the slot they do not deliver, and this is kept on purpose: callers
+    // have always seen this order of host calls. It does show in the result, though. A
+    // scan ends once both of its slots hold a name, so when the default view has a netlist
+    // unit the scratch text is still full when the translation view is scanned, and that
+    // scan stops at its first netlist unit, whose file is delivered; without one, the scan
+    // runs on and the translation view's last netlist unit wins. Likewise within the
+    // default view, a netlist unit ends the scan at the next constraints unit, so a later
+    // constraints unit no longer overwrites it.
     Text scratch;
     {
         AutoRelease<Dpm::IDesignUnitIterator> units;

@@ -91,11 +91,15 @@ bool Utilities::CreateNGC(const Port::StringBase<char>& ngcFile,
                           const Port::StringBase<char>& designName,
                           const Port::StringBase<char>& partName,
                           const Port::StringBase<char>& blockName) {
+    // Only this call's own stub counts: a file that another writer put under the same
+    // name meanwhile does not hold this design, so its mere presence proves nothing.
+    bool placed = false;
     try {
         // Owned here, so an exception in any step below still destroys the model, which
         // then throws its unfinished file away.
         auto model =
             std::make_unique<Nmod_Model>("STE_VARO_DUMMY_NGC_MODEL", "STE_VARO", kRevision, false);
+        model->RecordPlacementIn(&placed);
         model->Create(ngcFile.c_str(), false, false);
         model->CreateTxn("txn", Nmod_Txn::NMOD_TXN_UPDATE);
         Nmod_Design* design = model->GetDesignMgr()->CreateDesign(designName.c_str());
@@ -109,9 +113,9 @@ bool Utilities::CreateNGC(const Port::StringBase<char>& ngcFile,
         e.Report();
         return false;
     }
-    // The stub is put in place by the model's destructor, which cannot throw; a failure
-    // at that last step (already reported) shows as a missing file.
-    return Port::File::exist(ngcFile.c_str());
+    // The destructor that puts the stub in place cannot throw; when it fails it has
+    // reported why, and `placed` stays false.
+    return placed;
 }
 
 bool Utilities::CreateNGCFromNGD(const Port::StringBase<char>& ngdFile,

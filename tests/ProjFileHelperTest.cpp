@@ -15,6 +15,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -269,6 +270,36 @@ unit t DESUT_NGD "/d/" "second.ngd"
     EXPECT_THAT(result.debug,
                 ElementsAre("ZAM File p.zam\n", "Got ID for file DESUT_NGD\n",
                             "Got ID for file DESUT_UCF\n", "UCF File /d/first.ucf\n",
+                            "Got ID for file DESUT_NGD\n", "NGD File /d/first.ngd\n"));
+    ExpectEverythingReleased();
+}
+
+TEST_F(ProjectLookup, ANetlistUnitInTheDefaultViewDecidesWhichTranslationUnitIsDelivered) {
+    // The same translation view with two netlist units: which one is delivered depends on
+    // whether the default view has a netlist unit too, through the text both scans share.
+    const std::string translation = R"(binding a t
+unit t DESUT_NGD "/d/" "first.ngd"
+unit t DESUT_NGD "/d/" "second.ngd"
+unit t DESUT_UCF "/d/" "ignored.ucf"
+)";
+    const std::string head = "project p.zam\nview a VIEW_Synthesis\nview t VIEW_Translation\n"
+                             "default a\nunit a DESUT_UCF \"/d/\" \"a.ucf\"\n";
+
+    Describe(head + translation);
+    const Lookup alone = Run();
+    EXPECT_TRUE(alone.found);
+    EXPECT_EQ(alone.ucf, "/d/a.ucf");
+    EXPECT_EQ(alone.ngd, "/d/second.ngd") << "the scan runs through: the last unit wins";
+    EXPECT_EQ(std::count(alone.debug.begin(), alone.debug.end(), "Got ID for file DESUT_NGD\n"), 2);
+
+    Describe(head + "unit a DESUT_NGD \"/d/\" \"synth.ngd\"\n" + translation);
+    const Lookup shared = Run();
+    EXPECT_TRUE(shared.found);
+    EXPECT_EQ(shared.ucf, "/d/a.ucf");
+    EXPECT_EQ(shared.ngd, "/d/first.ngd") << "the scratch text is full: the first unit ends it";
+    EXPECT_THAT(shared.debug,
+                ElementsAre("ZAM File p.zam\n", "Got ID for file DESUT_UCF\n",
+                            "Got ID for file DESUT_NGD\n", "UCF File /d/a.ucf\n",
                             "Got ID for file DESUT_NGD\n", "NGD File /d/first.ngd\n"));
     ExpectEverythingReleased();
 }

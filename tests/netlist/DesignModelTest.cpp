@@ -366,3 +366,284 @@ TEST(NmodExceptions, ReportIsTheThirdVirtualOperationAndIssuesOneError) {
     EXPECT_EQ(message.unit, "../designmodel/DesignModelTest");
     EXPECT_EQ(message.line, line);
 }
+
+namespace {
+
+/// Reads `path` and expects a Format refusal whose message holds `words`, with nothing
+/// handed out.
+void ExpectRefusedAsFormat(const std::string& path, const std::string& words) {
+    Nmod_Model* model = nullptr;
+    Nmod_Txn* txn = nullptr;
+    try {
+        Nhlp_FileConv::ReadAsNmod(path.c_str(), model, txn, false);
+        ADD_FAILURE() << "read although it holds " << words;
+        delete model;
+    } catch (const Nmod_Exception::Format& e) {
+        EXPECT_NE(std::string(e.what()).find(words), std::string::npos) << e.what();
+    }
+    EXPECT_EQ(model, nullptr);
+    EXPECT_EQ(txn, nullptr);
+}
+
+} // namespace
+
+TEST_F(NetlistFiles, ALargeNgdIsReadInTimeProportionalToItsSize) {
+    // A reader that looked for duplicates by walking what it had read so far would take
+    // many minutes here: 100,000 designs, 50,000 views of one design and 50,000
+    // properties of one view.
+    const std::string path = PathOf("large.ngd");
+    VnTest::WriteLargeNgd(path, 100000, 50000, 50000);
+    EXPECT_EQ(Nhlp_FileConv::CanRead(path.c_str()), Nhlp_FileConv::FILE_READABLE);
+    {
+        const auto model = ReadNetlist(path);
+        ASSERT_NE(model, nullptr);
+        Nmod_DesignMgr* designs = model->GetDesignMgr();
+        ASSERT_EQ(designs->GetNumDesigns(), 100000u);
+        auto order = designs->GetDesignItr();
+        EXPECT_STREQ(order.Current()->GetName(), "D0");
+        Nmod_Design* first = order.Current();
+        EXPECT_EQ(first->GetViewItr().GetCount(), 50001u);
+        EXPECT_NE(first->GetViewByName("V49999"), nullptr);
+        Nmod_View* wide = first->GetViewByName("EXPANDED");
+        ASSERT_NE(wide, nullptr);
+        EXPECT_EQ(wide->GetNumProperties(), 50001u);
+        EXPECT_STREQ(wide->GetPropertyString("N49999"), "v49999");
+        Nmod_View* last = designs->GetDesignByName("D99999")->GetViewByName("EXPANDED");
+        ASSERT_NE(last, nullptr);
+        EXPECT_STREQ(last->GetPropertyString("PART"), "P99999");
+        ASSERT_NE(last->GetBlock(), nullptr);
+        EXPECT_STREQ(last->GetBlock()->GetName(), "B99999");
+    }
+
+    // A duplicate at the very end is still found, in each of the three tables.
+    const char* duplicates[][3] = {
+        {"nmod_design", "INSERT INTO nmod_design(name) VALUES ('D0')", "design \"D0\" twice"},
+        {"nmod_view", "INSERT INTO nmod_view(design_id, name) VALUES (1, 'V0')",
+         "view \"V0\" of design \"D0\" twice"},
+        {"nmod_view_property", "INSERT INTO nmod_view_property VALUES (1, 'N0', 'again')",
+         "property \"N0\" of view \"EXPANDED\" twice"},
+    };
+    for (const auto& [table, sql, words] : duplicates) {
+        SCOPED_TRACE(sql);
+        ExecSql(path, sql);
+        ExpectRefusedAsFormat(path, words);
+        const std::string undo = std::string("DELETE FROM ") + table +
+                                 " WHERE rowid = (SELECT max(rowid) FROM " + table + ")";
+        ExecSql(path, undo.c_str());
+    }
+    // The same names in different owners are no duplicates.
+    ExecSql(path, "INSERT INTO nmod_design(id, name) VALUES (200000, 'other');"
+                  "INSERT INTO nmod_view(design_id, name) VALUES (200000, 'V0');"
+                  "INSERT INTO nmod_view_property VALUES (2, 'N0', 'x');");
+    EXPECT_EQ(ReadNetlist(path)->GetDesignMgr()->GetNumDesigns(), 100001u);
+}
+
+TEST_F(NetlistFiles, ValuesOfAnotherTypeThanTheColumnsAreRefused) {
+    // Written as another program would, without STRICT tables: every column takes any
+    // type of value, and the reader must look at each.
+    const auto outside = [this](const std::string& name, const std::string& changes) {
+        const std::string path = PathOf(name);
+        ExecSql(path, VnTest::kOutsideSchema);
+        ExecSql(path, ("INSERT INTO nmod_format VALUES (1, 'NGD', " +
+                       std::to_string(Nmod_Model::kFormatVersion) +
+                       ", 'm', 't', 'v');"
+                       "INSERT INTO nmod_design VALUES (1, 'D');"
+                       "INSERT INTO nmod_view VALUES (1, 1, 'EXPANDED');"
+                       "INSERT INTO nmod_view_property VALUES (1, 'PART', 'P');"
+                       "INSERT INTO nmod_block VALUES (1, 1, 'B', 0);" +
+                       changes)
+                          .c_str());
+        return path;
+    };
+    const std::string good = outside("good.ngd", "");
+    EXPECT_EQ(Nhlp_FileConv::CanRead(good.c_str()), Nhlp_FileConv::FILE_READABLE);
+    const auto read = ReadNetlist(good);
+    ASSERT_NE(read, nullptr);
+    EXPECT_STREQ(read->GetDesignMgr()
+                     ->GetDesignByName("D")
+                     ->GetViewByName("EXPANDED")
+                     ->GetBlock()
+                     ->GetName(),
+                 "B");
+
+    struct Case {
+        const char* change;
+        const char* refusal;
+        bool formatRecord; // CanRead looks at the format record only
+    };
+    const Case cases[] = {
+        {"UPDATE nmod_format SET version = '2abc'", "format version that is not a whole", true},
+        {"UPDATE nmod_format SET version = 2.5", "format version that is not a whole", true},
+        {"UPDATE nmod_format SET version = CAST('2' AS BLOB)", "format version that is not a whole",
+         true},
+        {"UPDATE nmod_format SET kind = CAST('NGD' AS BLOB)", "format kind that is not text", true},
+        {"UPDATE nmod_format SET tool = x'7474'", "tool name that is not text", false},
+        {"UPDATE nmod_design SET name = CAST('D' AS BLOB)", "design name that is not text", false},
+        {"UPDATE nmod_view SET design_id = 'one'", "view's design that is not a whole", false},
+        {"UPDATE nmod_view SET name = x'4558'", "view name that is not text", false},
+        {"UPDATE nmod_view_property SET view_id = 1.5", "property's view that is not a whole",
+         false},
+        {"UPDATE nmod_view_property SET value = x'50'", "property value that is not text", false},
+        {"UPDATE nmod_block SET type = '0x'", "block type that is not a whole", false},
+        {"UPDATE nmod_block SET type = -1", "of a type out of range", false},
+        {"UPDATE nmod_block SET type = 4294967296", "of a type out of range", false},
+        {"UPDATE nmod_block SET name = NULL", "block name with no value", false},
+    };
+    int serial = 0;
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.change);
+        const std::string path = outside("bad" + std::to_string(serial++) + ".ngd", c.change);
+        EXPECT_EQ(Nhlp_FileConv::CanRead(path.c_str()),
+                  c.formatRecord ? Nhlp_FileConv::FILE_NOT_NGD : Nhlp_FileConv::FILE_READABLE);
+        ExpectRefusedAsFormat(path, c.refusal);
+    }
+    // The largest type a block can carry is kept whole.
+    const std::string widest = outside("widest.ngd", "UPDATE nmod_block SET type = 4294967295");
+    EXPECT_EQ(ReadNetlist(widest)
+                  ->GetDesignMgr()
+                  ->GetDesignByName("D")
+                  ->GetViewByName("EXPANDED")
+                  ->GetBlock()
+                  ->GetType(),
+              4294967295u);
+}
+
+TEST_F(NetlistFiles, ANameHoldingANulByteIsRefusedNotCut) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"UPDATE nmod_design SET name = CAST(x'440078' AS TEXT)", "design name with a NUL"},
+        {"UPDATE nmod_view SET name = CAST(x'45585000' AS TEXT)", "view name with a NUL"},
+        {"UPDATE nmod_view_property SET name = CAST(x'0050' AS TEXT)", "property name with a NUL"},
+        {"UPDATE nmod_view_property SET value = CAST(x'500031' AS TEXT)",
+         "property value with a NUL"},
+        {"UPDATE nmod_block SET name = CAST(x'420042' AS TEXT)", "block name with a NUL"},
+        {"UPDATE nmod_format SET model_name = CAST(x'6d006d' AS TEXT)", "model name with a NUL"},
+    };
+    int serial = 0;
+    for (const auto& [change, refusal] : cases) {
+        SCOPED_TRACE(change);
+        const std::string path = PathOf("nul" + std::to_string(serial++) + ".ngd");
+        WriteNetlist(path, {GoodDesign()});
+        // Without STRICT checks on, the engine keeps the NUL inside the text.
+        ExecSql(path, change);
+        ExpectRefusedAsFormat(path, refusal);
+    }
+}
+
+namespace {
+
+bool IsWalMode(const std::string& path) {
+    const std::string bytes = VnTest::ReadFile(path);
+    return bytes.size() > 19 && bytes[18] == 2 && bytes[19] == 2;
+}
+
+} // namespace
+
+TEST_F(NetlistFiles, AWriteAheadLogNgdIsReadWithoutWritingBesideIt) {
+    const std::string ngd = PathOf("wal.ngd");
+    WriteNetlist(ngd, {GoodDesign("top", "ice40hx8k-ct256", "root")});
+    ExecSql(ngd, "PRAGMA journal_mode = WAL");
+    ASSERT_TRUE(IsWalMode(ngd));
+    ASSERT_EQ(FolderContents(), std::vector<std::string>{"wal.ngd"});
+
+    // The folder is writable here, so a -wal or -shm file made by any step would show.
+    EXPECT_EQ(Nhlp_FileConv::CanRead(ngd.c_str()), Nhlp_FileConv::FILE_READABLE);
+    EXPECT_TRUE(Nmod_Model::IsQdbReadable(ngd.c_str()));
+    const auto model = ReadNetlist(ngd);
+    ASSERT_NE(model, nullptr);
+    Nmod_View* view = model->GetDesignMgr()->GetDesignByName("top")->GetViewByName("EXPANDED");
+    ASSERT_NE(view, nullptr);
+    EXPECT_STREQ(view->GetPropertyString("PART"), "ice40hx8k-ct256");
+    EXPECT_EQ(FolderContents(), std::vector<std::string>{"wal.ngd"})
+        << "reading wrote beside the file, even with the model still open";
+}
+
+TEST_F(NetlistFiles, AWriteAheadLogNgdInAReadOnlyFolderIsRead) {
+    if (::geteuid() == 0) {
+        GTEST_SKIP() << "running as root: a folder's permissions do not keep root from writing "
+                        "there, so they prove nothing; the test above checks that nothing is "
+                        "written beside the file";
+    }
+    const std::string ngd = PathOf("wal.ngd");
+    WriteNetlist(ngd, {GoodDesign()});
+    ExecSql(ngd, "PRAGMA journal_mode = WAL");
+    ASSERT_EQ(::chmod(m_folder.c_str(), 0555), 0);
+    EXPECT_EQ(Nhlp_FileConv::CanRead(ngd.c_str()), Nhlp_FileConv::FILE_READABLE);
+    EXPECT_TRUE(Nmod_Model::IsQdbReadable(ngd.c_str()));
+    const auto model = ReadNetlist(ngd);
+    ASSERT_NE(model, nullptr);
+    EXPECT_EQ(model->GetDesignMgr()->GetNumDesigns(), 1u);
+}
+
+TEST_F(NetlistFiles, AnNgdWhoseLastChangesStayInALogBesideItIsRefused) {
+    // Copy a file and its log while a writer holds changes in the log only.
+    const std::string live = PathOf("live.ngd");
+    WriteNetlist(live, {GoodDesign()});
+    ExecSql(live, "PRAGMA journal_mode = WAL");
+    sqlite3* writer = nullptr;
+    ASSERT_EQ(sqlite3_open(live.c_str(), &writer), SQLITE_OK);
+    ASSERT_EQ(
+        sqlite3_exec(writer, "UPDATE nmod_design SET name = 'renamed'", nullptr, nullptr, nullptr),
+        SQLITE_OK);
+    const std::string copy = PathOf("copy.ngd");
+    std::filesystem::copy_file(live, copy);
+    std::filesystem::copy_file(live + "-wal", copy + "-wal");
+    sqlite3_close(writer);
+    ASSERT_GT(std::filesystem::file_size(copy + "-wal"), 0u);
+    const std::string log = VnTest::ReadFile(copy + "-wal");
+
+    EXPECT_EQ(Nhlp_FileConv::CanRead(copy.c_str()), Nhlp_FileConv::FILE_NOT_NGD);
+    EXPECT_FALSE(Nmod_Model::IsQdbReadable(copy.c_str()));
+    ExpectRefusedAsFormat(copy, "never written into it");
+    EXPECT_EQ(VnTest::ReadFile(copy + "-wal"), log);
+    EXPECT_FALSE(std::filesystem::exists(copy + "-shm"));
+    // The writer's own file, its log taken back in when it closed, reads with the change.
+    EXPECT_NE(ReadNetlist(live)->GetDesignMgr()->GetDesignByName("renamed"), nullptr);
+}
+
+TEST_F(NetlistFiles, PlacementIsRecordedOnlyForTheModelsOwnFile) {
+    bool placed = true;
+    {
+        Nmod_Model model("m", "t", "v", false);
+        model.RecordPlacementIn(&placed);
+        EXPECT_FALSE(placed);
+        model.Create(PathOf("mine.ngc").c_str(), false, false);
+        model.GetDesignMgr()->CreateDesign("D");
+        EXPECT_FALSE(placed) << "nothing is in place before the model is done";
+    }
+    EXPECT_TRUE(placed);
+
+    // Another writer's file under the name: the model keeps out, and says it did.
+    const std::string raced = PathOf("raced.ngc");
+    {
+        VnTest::MessageCapture capture;
+        Nmod_Model model("m", "t", "v", false);
+        model.RecordPlacementIn(&placed);
+        model.Create(raced.c_str(), false, false);
+        WriteFile(raced, "first");
+    }
+    EXPECT_FALSE(placed);
+    EXPECT_EQ(VnTest::ReadFile(raced), "first");
+
+    // Close finishes early and records it there.
+    Nmod_Model closing("m", "t", "v", false);
+    closing.RecordPlacementIn(&placed);
+    closing.Create(PathOf("closed.ngc").c_str(), false, false);
+    closing.Close();
+    EXPECT_TRUE(placed);
+
+    // A model unwound by an exception, or one that never wrote, places nothing.
+    try {
+        Nmod_Model model("m", "t", "v", false);
+        model.RecordPlacementIn(&placed);
+        model.Create(PathOf("unwound.ngc").c_str(), false, false);
+        throw std::runtime_error("given up");
+    } catch (const std::runtime_error&) {
+    }
+    EXPECT_FALSE(placed);
+    {
+        Nmod_Model idle("m", "t", "v", false);
+        idle.RecordPlacementIn(&placed);
+        idle.Close();
+    }
+    EXPECT_FALSE(placed);
+}

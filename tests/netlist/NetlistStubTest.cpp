@@ -5,8 +5,11 @@
 #include "designmodel/Nmod_Exception.h"
 #include "s/Utilities.h"
 
+#include <condition_variable>
+#include <mutex>
 #include <set>
 #include <sys/stat.h>
+#include <thread>
 
 using Vn::Eng::Utilities;
 using VnTest::DesignSpec;
@@ -291,4 +294,80 @@ TEST_F(NetlistStubs, AStubThatFailsWhileBeingWrittenLeavesNoFile) {
     EXPECT_GE(failures, 8);
     EXPECT_EQ(FolderContents(), std::vector<std::string>{"top.ngc"});
     EXPECT_EQ(ReadNetlist(ngc)->GetDesignMgr()->GetNumDesigns(), 1u);
+}
+
+TEST_F(NetlistStubs, OfWritersRacingForOneNameOnlyTheOneWhoseStubLandedSucceeds) {
+    // Errors of the losers are counted, not printed; the sink may be called from every
+    // thread at once.
+    std::mutex sinkMutex;
+    int errors = 0;
+    Port::MessageSink previous = Port::SetMessageSink([&](const Port::Message& message) {
+        const std::lock_guard<std::mutex> lock(sinkMutex);
+        errors += message.severity == Port::Severity::Error ? 1 : 0;
+    });
+    constexpr int kWriters = 8;
+    constexpr int kRounds = 25;
+    int lateLosers = 0;
+    for (int round = 0; round < kRounds; ++round) {
+        SCOPED_TRACE("round " + std::to_string(round));
+        const std::string ngc = PathOf("race" + std::to_string(round) + ".ngc");
+        std::mutex startMutex;
+        std::condition_variable start;
+        bool go = false;
+        bool results[kWriters] = {};
+        std::vector<std::thread> writers;
+        for (int i = 0; i < kWriters; ++i) {
+            writers.emplace_back([&, i] {
+                {
+                    std::unique_lock<std::mutex> lock(startMutex);
+                    start.wait(lock, [&] { return go; });
+                }
+                const std::string design = "design" + std::to_string(i);
+                results[i] = Utilities::CreateNGC(ngc.c_str(), design.c_str(), "P", "B");
+            });
+        }
+        {
+            const std::lock_guard<std::mutex> lock(startMutex);
+            go = true;
+        }
+        start.notify_all();
+        for (auto& writer : writers) {
+            writer.join();
+        }
+        std::vector<int> winners;
+        for (int i = 0; i < kWriters; ++i) {
+            if (results[i]) {
+                winners.push_back(i);
+            }
+        }
+        ASSERT_EQ(winners.size(), 1u) << "exactly one writer's stub is in the file";
+        const auto stub = ReadNetlist(ngc);
+        ASSERT_EQ(stub->GetDesignMgr()->GetNumDesigns(), 1u);
+        EXPECT_STREQ(stub->GetDesignMgr()->GetDesignItr().Current()->GetName(),
+                     ("design" + std::to_string(winners[0])).c_str());
+        // Losers that got past the existence check found the name taken only at the end.
+        const std::lock_guard<std::mutex> lock(sinkMutex);
+        lateLosers += errors;
+        errors = 0;
+    }
+    Port::SetMessageSink(std::move(previous));
+    EXPECT_EQ(FolderContents().size(), static_cast<size_t>(kRounds)) << "no private file is left";
+    RecordProperty("losers", lateLosers);
+}
+
+TEST_F(NetlistStubs, AStubOfAnotherWriterThatLandsFirstIsNoSuccess) {
+    // Both writers passed the check for an existing file; the other one's stub lands
+    // while this one is finishing.
+    Nmod_Testing::BeforeMoveIntoPlace([](const char* finalPath) {
+        Nmod_Testing::BeforeMoveIntoPlace(nullptr);
+        ASSERT_TRUE(Utilities::CreateNGC(finalPath, "theirs", "P2", "B2"));
+    });
+    const std::string ngc = PathOf("top.ngc");
+    VnTest::MessageCapture capture;
+    const bool ours = Utilities::CreateNGC(ngc.c_str(), "ours", "P", "B");
+    Nmod_Testing::BeforeMoveIntoPlace(nullptr);
+    EXPECT_FALSE(ours) << "the file holds another writer's design";
+    EXPECT_EQ(capture.Errors().size(), 1u) << "the loser says why";
+    EXPECT_STREQ(ReadNetlist(ngc)->GetDesignMgr()->GetDesignItr().Current()->GetName(), "theirs");
+    EXPECT_EQ(FolderContents(), std::vector<std::string>{"top.ngc"});
 }

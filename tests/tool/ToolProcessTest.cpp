@@ -487,6 +487,33 @@ TEST_F(ToolProcess, AStubIsMadeFromFourNamesInTheirOrder) {
     EXPECT_EQ(ReadStub(m_dir / "n.ngc").design, "design_d");
 }
 
+TEST_F(ToolProcess, OfConcurrentRunsWritingOneStubOnlyTheOneWhoseDesignLandedSucceeds) {
+    // Twelve runs at once, ten times over: whichever run finishes first owns the file,
+    // and every other run, however far it got, reports failure.
+    constexpr int kRuns = 12;
+    constexpr int kRounds = 10;
+    for (int round = 0; round < kRounds; ++round) {
+        SCOPED_TRACE("round " + std::to_string(round));
+        const std::string ngc = "race" + std::to_string(round) + ".ngc";
+        std::string command = "cd " + Quote(m_dir.string()) + " && for i in $(seq 0 " +
+                              std::to_string(kRuns - 1) + "); do (" + Quote(VENLOMER_TOOL_PATH) +
+                              " ngc-new " + ngc +
+                              " design_$i part block >/dev/null 2>&1; echo $? >status$i) & "
+                              "done; wait";
+        ASSERT_EQ(std::system(command.c_str()), 0);
+        std::vector<int> winners;
+        for (int i = 0; i < kRuns; ++i) {
+            const std::string status = Slurp(m_dir / ("status" + std::to_string(i)));
+            EXPECT_TRUE(status == "0\n" || status == "1\n") << "run " << i << ": " << status;
+            if (status == "0\n") {
+                winners.push_back(i);
+            }
+        }
+        ASSERT_EQ(winners.size(), 1u) << "exactly one run may say it wrote the stub";
+        EXPECT_EQ(ReadStub(m_dir / ngc).design, "design_" + std::to_string(winners[0]));
+    }
+}
+
 // ---- project files --------------------------------------------------------------------
 
 TEST_F(ToolProcess, ProjectFilesComeFromTheSampleHostsProject) {

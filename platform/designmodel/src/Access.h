@@ -30,8 +30,9 @@ struct Access {
     static void SetId(Nmod_Design& design, long long id);
     static void SetId(Nmod_View& view, long long id);
 
-    // The reader builds a model from stored rows with these; records that contradict
-    // the ones before them throw Format.
+    // The reader builds a model from stored rows with these. They do not look for
+    // duplicates: the reader does, in one pass over each table, and throws Format. Only
+    // AddBlock refuses a second root block itself.
     static std::unique_ptr<Nmod_Model> NewReadModel(const std::string& modelName,
                                                     const std::string& toolName,
                                                     const std::string& toolVersion,

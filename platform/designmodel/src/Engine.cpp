@@ -7,12 +7,19 @@
 #include "designmodel/Nmod_Testing.h"
 
 #include <atomic>
+#include <cerrno>
+#include <sys/stat.h>
 #include <utility>
 
 namespace {
 std::atomic<long> g_stepsTaken{0};
 std::atomic<long> g_failingStep{-1};
+std::atomic<void (*)(const char*)> g_beforeMove{nullptr};
 } // namespace
+
+void Nmod_Testing::BeforeMoveIntoPlace(void (*hook)(const char* finalPath)) {
+    g_beforeMove = hook;
+}
 
 void Nmod_Testing::FailWriteStep(long step) {
     g_stepsTaken = 0;
@@ -30,6 +37,12 @@ std::string EnginePath(const std::string& fileName) {
         return "./" + fileName;
     }
     return fileName;
+}
+
+void RunBeforeMoveHook(const std::string& finalPath) {
+    if (auto* hook = g_beforeMove.load()) {
+        hook(finalPath.c_str());
+    }
 }
 
 void CountWriteStep() {
@@ -71,9 +84,60 @@ sqlite3* Open(const std::string& fileName, int flags, const char* context) {
 
 } // namespace
 
+namespace {
+
+// The engine's name for a file that it may only read and that nobody changes meanwhile:
+// a URI with immutable=1, so that it neither locks the file nor opens or creates the
+// -wal and -shm files of a write-ahead-log database beside it. Every byte of the path
+// that could mean something in a URI is escaped.
+std::string ImmutableUri(const std::string& fileName) {
+    static const char kHex[] = "0123456789ABCDEF";
+    std::string uri = "file:";
+    for (const unsigned char c : EnginePath(fileName)) {
+        const bool plain = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
+                           (c >= '0' && c <= '9') || c == '/' || c == '.' || c == '-' || c == '_' ||
+                           c == '~';
+        if (plain) {
+            uri += static_cast<char>(c);
+        } else {
+            uri += '%';
+            uri += kHex[c >> 4];
+            uri += kHex[c & 0xF];
+        }
+    }
+    return uri + "?immutable=1";
+}
+
+// Read as immutable, a file whose last changes still sit in a log beside it would be
+// read without them, and a file beside a rollback journal may be half written. Such a
+// file is refused rather than read wrong.
+void RefuseUnfinishedChanges(const std::string& fileName) {
+    for (const char* suffix : {"-wal", "-journal"}) {
+        struct stat info {};
+        const std::string beside = fileName + suffix;
+        if (::stat(beside.c_str(), &info) == 0 && info.st_size > 0) {
+            throw Nmod_Exception::Format("netlist database \"" + fileName + "\" has changes in \"" +
+                                         beside + "\" that were never written into it");
+        }
+    }
+}
+
+} // namespace
+
 Connection Connection::OpenForReading(const std::string& fileName) {
-    Connection connection(
-        Open(fileName, SQLITE_OPEN_READONLY | SQLITE_OPEN_NOMUTEX, "cannot open netlist database"));
+    RefuseUnfinishedChanges(fileName);
+    sqlite3* db = nullptr;
+    const int rc =
+        sqlite3_open_v2(ImmutableUri(fileName).c_str(), &db,
+                        SQLITE_OPEN_READONLY | SQLITE_OPEN_URI | SQLITE_OPEN_NOMUTEX, nullptr);
+    if (rc != SQLITE_OK) {
+        std::string message = "cannot open netlist database \"" + fileName +
+                              "\": " + (db != nullptr ? sqlite3_errmsg(db) : sqlite3_errstr(rc));
+        sqlite3_close(db);
+        throw Nmod_Exception::Database(std::move(message), rc & 0xff);
+    }
+    sqlite3_extended_result_codes(db, 0);
+    Connection connection(db);
     // A netlist file may come from anywhere: functions named in its schema must not get
     // to run with side effects, and the schema itself stays out of reach.
     sqlite3_db_config(connection.m_db, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
@@ -167,6 +231,10 @@ void Statement::Reset() {
 
 bool Statement::IsNull(int column) const {
     return sqlite3_column_type(m_stmt, column) == SQLITE_NULL;
+}
+
+int Statement::Type(int column) const {
+    return sqlite3_column_type(m_stmt, column);
 }
 
 long long Statement::Int(int column) const {

@@ -16,6 +16,9 @@ namespace Nmod_Detail {
 /// so that a file called "file:..." is always a file and never read as a URI.
 std::string EnginePath(const std::string& fileName);
 
+/// Calls the hook a test set with Nmod_Testing::BeforeMoveIntoPlace, if any.
+void RunBeforeMoveHook(const std::string& finalPath);
+
 /// Counts one write step and throws the injected failure when it is the chosen one.
 void CountWriteStep();
 
@@ -30,6 +33,8 @@ public:
 
     /// Opens an existing file for reading only, with the defences for files that come
     /// from outside (no schema-defined functions with side effects, no writable schema).
+    /// Nothing is written beside the file, not even in a write-ahead-log database; a file
+    /// with unfinished changes in a log or journal beside it is refused (Format).
     static Connection OpenForReading(const std::string& fileName);
     /// Opens a file for writing (an empty file becomes a new database).
     static Connection OpenForWriting(const std::string& fileName);
@@ -63,6 +68,9 @@ public:
     void Reset();
 
     bool IsNull(int column) const;
+    /// The engine's storage class of the column's value (SQLITE_INTEGER, SQLITE_TEXT...):
+    /// a table declared without STRICT may hold any type in any column.
+    int Type(int column) const;
     long long Int(int column) const;
     /// The column as bytes (a NUL inside stays).
     std::string Text(int column) const;

@@ -55,7 +55,8 @@ public:
     void SetViewProperty(long long viewId, const std::string& name, const std::string& value);
     long long InsertBlock(long long viewId, const std::string& name, unsigned int type);
 
-    /// Commits and moves the file into place; on failure nothing is left and it throws.
+    /// Commits, syncs and moves the file into place; returns only when this store's own
+    /// file is under the final name. On failure nothing is left and it throws.
     void Finish();
     /// Drops the private file; the final name is not touched.
     void Discard() noexcept;
@@ -78,6 +79,7 @@ private:
     }
     void Exec(const char* sql);
     void MakePrivateFile();
+    void SyncPrivateFile();
     void MoveIntoPlace();
 
     std::string m_finalPath;
@@ -207,6 +209,9 @@ void Store::Finish() {
             Exec("COMMIT");
             m_db.Close("cannot finish netlist database " + Quoted(m_finalPath));
             CountWriteStep();
+            SyncPrivateFile();
+            CountWriteStep();
+            RunBeforeMoveHook(m_finalPath);
             MoveIntoPlace();
         });
     } catch (...) {
@@ -222,6 +227,22 @@ void Store::Finish() {
         ::fsync(fd);
         ::close(fd);
     }
+}
+
+void Store::SyncPrivateFile() {
+    // The move must not reach the disk before the content it names: after a crash the
+    // final name would hold a file with pages missing.
+    const int fd = ::open(m_tempPath.c_str(), O_RDONLY | O_CLOEXEC);
+    if (fd < 0 || ::fsync(fd) != 0) {
+        const int error = errno;
+        if (fd >= 0) {
+            ::close(fd);
+        }
+        throw Nmod_Exception::Database("cannot finish netlist database " + Quoted(m_finalPath) +
+                                           ": " + std::strerror(error),
+                                       SQLITE_IOERR);
+    }
+    ::close(fd);
 }
 
 void Store::MoveIntoPlace() {
@@ -278,6 +299,8 @@ struct Nmod_Model::Imp {
     // Exceptions in flight when writing began: more of them at destruction means the
     // writer is being unwound, and its file must not be finished.
     int uncaughtAtCreate = 0;
+    // Where to record that this model's own file went into place; may be null.
+    bool* placed = nullptr;
     std::unique_ptr<Nmod_Detail::Store> store;
     std::unique_ptr<Nmod_DesignMgr> designMgr;
     std::unique_ptr<Nmod_Txn> txn;
@@ -443,6 +466,9 @@ Nmod_Model::~Nmod_Model() {
     }
     try {
         m_imp->store->Finish();
+        if (m_imp->placed != nullptr) {
+            *m_imp->placed = true;
+        }
     } catch (const Nmod_Exception::Base& e) {
         // A destructor cannot throw: say why the file is missing instead.
         e.Report();
@@ -517,6 +543,16 @@ void Nmod_Model::Close() {
     m_imp->closed = true;
     if (auto store = std::move(m_imp->store)) {
         store->Finish();
+        if (m_imp->placed != nullptr) {
+            *m_imp->placed = true;
+        }
+    }
+}
+
+void Nmod_Model::RecordPlacementIn(bool* placed) {
+    m_imp->placed = placed;
+    if (placed != nullptr) {
+        *placed = false;
     }
 }
 
@@ -594,30 +630,17 @@ std::unique_ptr<Nmod_Model> Access::NewReadModel(const std::string& modelName,
 }
 
 Nmod_Design* Access::AddDesign(Nmod_Model& model, long long id, std::string name) {
-    Nmod_DesignMgr& designs = *model.m_imp->designMgr;
-    if (designs.GetDesignByName(name.c_str()) != nullptr) {
-        throw Nmod_Exception::Format("design \"" + name + "\" is stored twice");
-    }
-    designs.m_designs.emplace_back(NewDesign(&model, id, std::move(name)));
-    return designs.m_designs.back().get();
+    auto& designs = model.m_imp->designMgr->m_designs;
+    designs.emplace_back(NewDesign(&model, id, std::move(name)));
+    return designs.back().get();
 }
 
 Nmod_View* Access::AddView(Nmod_Design& design, long long id, std::string name) {
-    if (design.GetViewByName(name.c_str()) != nullptr) {
-        throw Nmod_Exception::Format("view \"" + name + "\" of design \"" + design.m_name +
-                                     "\" is stored twice");
-    }
     design.m_views.emplace_back(NewView(&design, id, std::move(name)));
     return design.m_views.back().get();
 }
 
 void Access::AddProperty(Nmod_View& view, std::string name, std::string value) {
-    for (auto& property : view.m_properties) {
-        if (property.first == name) {
-            throw Nmod_Exception::Format("property \"" + name + "\" of view \"" + view.m_name +
-                                         "\" is stored twice");
-        }
-    }
     view.m_properties.emplace_back(std::move(name), std::move(value));
 }
 

@@ -25,8 +25,9 @@ public:
         FILE_READABLE = 0,
         FILE_NOT_FOUND = 1,
         FILE_NO_READ_PERMISSION = 2,
-        /// Not SQLite, no format record or tables, another kind (an NGC), or a format
-        /// version newer than this library knows.
+        /// Not SQLite, no format record or tables, another kind (an NGC), a format
+        /// version newer than this library knows, a kind or version stored as a value of
+        /// another type, or changes left in a -wal or -journal file beside it.
         FILE_NOT_NGD = 3,
         /// An NGD of an older format version.
         FILE_OBSOLETE = 4,
@@ -38,9 +39,11 @@ public:
     static FileStatus CanRead(const char* fileName);
 
     /// Reads an NGD or NGC file into a new read-only model with an open read-only
-    /// transaction and hands both out (the model owns the transaction; the caller deletes
-    /// the model). With `checkIntegrity` the whole file is checked first. On failure
-    /// throws (Database, Format or Usage) and leaves both arguments as they were.
+    /// transaction and hands both out (the model owns the transaction; the caller
+    /// deletes the model). With `checkIntegrity` the whole file is checked first. Nothing
+    /// is written beside the file. Values of another type than their column's, names
+    /// holding a NUL byte and duplicate names are refused (Format). On failure throws
+    /// (Database, Format or Usage) and leaves both arguments as they were.
     static void ReadAsNmod(const char* fileName, Nmod_Model*& model, Nmod_Txn*& txn,
                            bool checkIntegrity);
 };

@@ -16,8 +16,9 @@
 //
 // Writing is all or nothing. A writing model works on a file of its own, named
 // ".<name>.tmp-<unique>" in the folder of the final name, inside one database
-// transaction. Close(), or the destructor when Close was not called, commits and then
-// moves that file to the final name in one step. A model that saw a failure, or that is
+// transaction. Close(), or the destructor when Close was not called, commits, flushes the
+// file to the disk and then moves it to the final name in one step (and flushes the
+// folder, so that the move survives a crash too). A model that saw a failure, or that is
 // destroyed while an exception unwinds the stack, deletes its file instead. So a crash,
 // an exception or a full disk never leaves a half-written database under the final
 // name, where a later run would take it as finished. The move never replaces a file
@@ -266,6 +267,14 @@ public:
     /// cannot; the file is then gone). Later writes throw Usage. Closing twice, or
     /// closing a model that writes nothing, does nothing.
     virtual void Close();
+
+    /// Has the model record whether its own file was put under the final name: `*placed`
+    /// becomes false now, and true only when this model's move into place succeeds, in
+    /// Close or in the destructor. The destructor cannot throw, and a file of the same
+    /// name made meanwhile by another writer is no proof of this model's work, so a
+    /// caller that leaves finishing to the destructor learns the outcome here. `placed`
+    /// must stay valid until the model is finished or destroyed; null stops recording.
+    void RecordPlacementIn(bool* placed);
 
     const char* GetModelName() const;
     const char* GetToolName() const;

@@ -25,4 +25,9 @@ VN_VISIBLE void FailWriteStep(long step);
 /// The write steps taken since the last call of FailWriteStep.
 VN_VISIBLE long WriteStepsTaken();
 
+/// Calls `hook` with the final file name right before each move of a finished file into
+/// place, so that a test can make another writer's file appear at the last moment. Null
+/// removes the hook.
+VN_VISIBLE void BeforeMoveIntoPlace(void (*hook)(const char* finalPath));
+
 } // namespace Nmod_Testing
