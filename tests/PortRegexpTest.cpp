@@ -205,7 +205,7 @@ TEST(PortRegexp, TheCacheIsBoundedByTheMemoryItsExpressionsMayHold) {
         seed = seed * 1103515245u + 12345u;
         text += (seed >> 16) & 1 ? 'a' : 'b';
     }
-    const std::size_t residentBefore = residentBytes();
+    [[maybe_unused]] const std::size_t residentBefore = residentBytes();
     std::size_t mostAccounted = 0;
     for (int i = 0; i < 300; ++i) {
         std::string pattern = "[ab]*a[ab]{14}c|q" + std::to_string(i) + "_";
