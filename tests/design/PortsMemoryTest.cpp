@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <string>
@@ -59,6 +60,11 @@ ProbeResult Probe(const fs::path& netlist, const fs::path& outFile) {
     if (child == 0) {
         std::FILE* out = std::freopen(outFile.c_str(), "w", stdout);
         (void)out;
+        // Under AddressSanitizer freed blocks wait in a quarantine of up to 256 MB, which
+        // would be counted as the reader's; keep it small.
+        const char* asan = std::getenv("ASAN_OPTIONS");
+        std::string options = std::string(asan != nullptr ? asan : "") + ":quarantine_size_mb=4";
+        setenv("ASAN_OPTIONS", options.c_str(), 1);
         execl(VENLOMER_PORTS_PROBE, VENLOMER_PORTS_PROBE, netlist.c_str(), nullptr);
         _exit(127);
     }
@@ -74,12 +80,12 @@ ProbeResult Probe(const fs::path& netlist, const fs::path& outFile) {
     return result;
 }
 
-TEST(PortsMemory, ReadingTheSixtyMegabytesOfCellsKeepsTheirMemoryOut) {
+TEST(PortsMemory, ReadingFiftyMegabytesOfCellsKeepsThemOutOfMemory) {
     fs::path folder = fs::temp_directory_path() /
                       ("venlomer-ports-memory-" + std::to_string(static_cast<long>(getpid())));
     fs::create_directories(folder);
     WriteNetlist(folder / "small.json", 10);
-    WriteNetlist(folder / "large.json", 170000);
+    WriteNetlist(folder / "large.json", 140000);
     std::error_code ec;
     auto size = fs::file_size(folder / "large.json", ec);
     EXPECT_GT(size, 50u * 1024 * 1024);

@@ -84,12 +84,33 @@ protected:
         s_folder = fs::temp_directory_path() /
                    ("venlomer-toolchain-" + std::to_string(static_cast<long>(::getpid())));
         fs::create_directories(s_folder);
+        // ctest runs every test in a process of its own: the netlists are kept in the
+        // build tree and made again only when their Verilog is newer.
+        fs::create_directories(VENLOMER_DESIGN_CACHE);
         for (const Target* target : {&kOneK, &kEightK}) {
-            fs::path json = s_folder / (std::string(target->name) + ".json");
-            std::string command = "yosys -q -p 'synth_ice40 -top top -json " + json.string() +
-                                  "' '" + VENLOMER_DESIGN_DATA + "/" + target->name + ".v'";
+            fs::path verilog = fs::path(VENLOMER_DESIGN_DATA) / (std::string(target->name) + ".v");
+            fs::path json = Json(*target);
+            std::error_code ec;
+            if (fs::exists(json, ec) &&
+                fs::last_write_time(json, ec) >= fs::last_write_time(verilog, ec)) {
+                continue;
+            }
+            // Written under a name of this process, then renamed: a test program running
+            // beside this one never reads half a netlist.
+            fs::path partial = s_folder / (std::string(target->name) + ".json");
+            std::string command = "yosys -q -p 'synth_ice40 -top top -json " + partial.string() +
+                                  "' '" + verilog.string() + "'";
             if (RunCommand(command, s_folder / (std::string(target->name) + ".yosys.log")) != 0) {
                 s_missing = "a working yosys (" + command + " failed)";
+                return;
+            }
+            fs::copy_file(partial,
+                          json.string() + ".part" + std::to_string(static_cast<long>(::getpid())),
+                          fs::copy_options::overwrite_existing, ec);
+            fs::rename(json.string() + ".part" + std::to_string(static_cast<long>(::getpid())),
+                       json, ec);
+            if (ec) {
+                s_missing = "a writable build tree (" + json.string() + ": " + ec.message() + ")";
                 return;
             }
         }
@@ -113,7 +134,7 @@ protected:
         ASSERT_TRUE(VnTool::ReadYosysPortsFile(Json(target), design, error)) << error;
     }
     static std::string Json(const Target& target) {
-        return (s_folder / (std::string(target.name) + ".json")).string();
+        return (fs::path(VENLOMER_DESIGN_CACHE) / (std::string(target.name) + ".json")).string();
     }
 
     // nextpnr's verdict on a constraint file: its exit status, and the bel it constrained

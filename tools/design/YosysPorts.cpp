@@ -198,8 +198,9 @@ public:
 
     bool key(string_t& value) override {
         Frame& frame = m_frames.back();
+        // Assigned, not moved: the frame's key keeps its capacity from cell to cell.
         if (frame.role != Role::Ignored) {
-            frame.key = std::move(value);
+            frame.key.assign(value);
         }
         return true;
     }
