@@ -1,8 +1,9 @@
 //===-- tools/ChipDb.cpp - reads the tiles and package pins of a chip database --===//
 #include "ChipDb.h"
 
+#include "Port/SafeFile.h"
+
 #include <charconv>
-#include <fstream>
 #include <set>
 #include <unordered_map>
 #include <unordered_set>
@@ -312,12 +313,17 @@ bool ReadChipDb(std::istream& in, std::string_view source, std::string_view pack
 
 bool ReadChipDbFile(const std::string& path, std::string_view package, ChipDb& db,
                     std::string& error) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) {
-        error = path + ": cannot open the chip database";
+    Port::InputFile file;
+    if (!file.Open(path, error, Port::kMaxInputBytes, true)) {
         return false;
     }
-    return ReadChipDb(in, path, package, db, error);
+    const std::string source = path == "-" ? "standard input" : path;
+    if (!ReadChipDb(file.Stream(), source, package, db, error)) {
+        // A read cut short at the limit shows up as a truncated file; say which it was.
+        file.Failed(error);
+        return false;
+    }
+    return !file.Failed(error);
 }
 
 } // namespace VnTool

@@ -1,10 +1,9 @@
 //===-- tools/Svg.cpp - a minimal SVG document writer ---------------------------===//
 #include "Svg.h"
 
-#include <cerrno>
+#include "Port/SafeFile.h"
+
 #include <cstdio>
-#include <cstring>
-#include <fstream>
 
 namespace VnTool {
 
@@ -104,30 +103,9 @@ std::string SvgWriter::Finish() const {
            m_body + "</svg>\n";
 }
 
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error) {
-    // Written beside the target and renamed over it, so that a full disk or a kill never
-    // leaves a truncated picture under the name the user asked for.
-    std::string temporary = path + ".part";
-    {
-        std::ofstream out(temporary, std::ios::binary | std::ios::trunc);
-        if (!out) {
-            error = "cannot write " + path + ": " + std::strerror(errno);
-            return false;
-        }
-        out << text;
-        out.flush();
-        if (!out) {
-            error = "cannot write " + path + ": " + std::strerror(errno);
-            std::remove(temporary.c_str());
-            return false;
-        }
-    }
-    if (std::rename(temporary.c_str(), path.c_str()) != 0) {
-        error = "cannot write " + path + ": " + std::strerror(errno);
-        std::remove(temporary.c_str());
-        return false;
-    }
-    return true;
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs) {
+    return Port::WriteFileSafely(path, text, error, inputs);
 }
 
 } // namespace VnTool

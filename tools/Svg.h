@@ -10,6 +10,7 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace VnTool {
 
@@ -41,7 +42,9 @@ private:
     double m_height;
 };
 
-/// Writes text to path. Returns false with a reason in error when it cannot.
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error);
+/// Writes text to path through the safe writer (Port/SafeFile.h): whole or not at all,
+/// never over one of `inputs`. Returns false with a reason in error when it cannot.
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs = {});
 
 } // namespace VnTool
