@@ -10,6 +10,7 @@
 
 #include <fcntl.h>
 #include <signal.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 #include <sys/time.h>
@@ -353,6 +354,88 @@ TEST_F(FileSafety, AChipDatabaseMayComeFromStandardInput) {
     EXPECT_TRUE(Contains(Slurp(m_dir / "stdout"), "from standard input"))
         << Slurp(m_dir / "stdout");
     EXPECT_TRUE(WholeSvg(Slurp(m_dir / "in.svg")));
+}
+
+TEST_F(FileSafety, ATruncatedChipDatabaseIsRefusedWithItsLine) {
+    const std::string whole = Slurp(m_chipDb);
+    const std::size_t bulk = whole.find(".io_tile_bits");
+    ASSERT_NE(bulk, std::string::npos);
+    // Cuts spread over the file: inside the tiles, and mid-line in the bulk after them.
+    for (int i = 1; i <= 15; ++i) {
+        std::size_t cut = whole.size() * static_cast<std::size_t>(i) / 16;
+        while (cut >= bulk && whole[cut - 1] == '\n') {
+            --cut; // a cut at a line end after the tiles leaves a whole device
+        }
+        Put(m_dir / "cut.txt", whole.substr(0, cut));
+        Result result = Run({"floorplan", "--chipdb", "cut.txt", "--svg", "cut.svg"});
+        EXPECT_EQ(result.status, 1) << "cut at " << cut;
+        EXPECT_TRUE(Contains(result.err, "venlomer floorplan: cut.txt:")) << result.err;
+        EXPECT_FALSE(fs::exists(m_dir / "cut.svg"));
+    }
+}
+
+TEST_F(FileSafety, PeakMemoryStaysASmallMultipleOfTheChipDatabase) {
+#if defined(__SANITIZE_ADDRESS__)
+    GTEST_SKIP() << "the sanitizer's allocator keeps freed memory in quarantine";
+#endif
+    // A whole grid of the given side, all of it tiles with every IO block bonded, and a
+    // bulk of routing lines: what a crafted file can make the tool hold.
+    auto write = [&](int side, int nets) {
+        std::ofstream out(m_dir / "big.txt", std::ios::binary | std::ios::trunc);
+        out << ".device big " << side << " " << side << " 0\n.pins p\n";
+        int pin = 0;
+        for (int x = 1; x < side - 1; ++x) {
+            for (int y : {0, side - 1}) {
+                for (int block = 0; block < 2; ++block) {
+                    out << "P" << pin++ << " " << x << " " << y << " " << block << "\n";
+                }
+            }
+        }
+        for (int x = 0; x < side; ++x) {
+            for (int y = 0; y < side; ++y) {
+                const bool xEdge = x == 0 || x == side - 1;
+                const bool yEdge = y == 0 || y == side - 1;
+                if (!(xEdge && yEdge)) {
+                    out << (xEdge || yEdge ? ".io_tile " : ".logic_tile ") << x << " " << y << "\n";
+                }
+            }
+        }
+        for (int net = 0; net < nets; ++net) {
+            out << ".net " << net << "\n";
+            for (int i = 0; i < 25; ++i) {
+                out << "12 34 span4_horz_r_1\n";
+            }
+        }
+    };
+    // Runs the tool on it; the exit status, and the peak checked against the input.
+    auto run = [&]() {
+        const auto input = fs::file_size(m_dir / "big.txt");
+        const pid_t child = ::fork();
+        if (child == 0) {
+            const int devnull = ::open("/dev/null", O_WRONLY);
+            ::dup2(devnull, 1);
+            ::dup2(devnull, 2);
+            ::execl(VENLOMER_TOOL_PATH, "venlomer", "floorplan", "--chipdb",
+                    (m_dir / "big.txt").c_str(), "--svg", (m_dir / "big.svg").c_str(),
+                    static_cast<char*>(nullptr));
+            ::_exit(127);
+        }
+        int status = 0;
+        struct rusage usage {};
+        EXPECT_EQ(::wait4(child, &status, 0, &usage), child);
+        const auto peak = static_cast<std::uintmax_t>(usage.ru_maxrss) * 1024;
+        EXPECT_LE(peak, 4 * input + (64u << 20)) << "peak " << peak << " for " << input;
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    };
+    // A grid far beyond any device of the family: refused, or held within the bound.
+    write(1024, 0);
+    const int huge = run();
+    EXPECT_TRUE(huge == 0 || huge == 1) << huge;
+    // The largest grid taken, in a file of the size of the real databases.
+    write(128, 40000);
+    ASSERT_GT(fs::file_size(m_dir / "big.txt"), 20u << 20);
+    EXPECT_EQ(run(), 0);
+    EXPECT_TRUE(WholeSvg(Slurp(m_dir / "big.svg")));
 }
 
 } // namespace
