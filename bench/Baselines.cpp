@@ -168,9 +168,8 @@ void SearchBagsStdRegexOnce(benchmark::State& state) {
         size_t matches = 0;
         for (const Bag& bag : bags) {
             auto found = bag.find(name);
-            if (found != bag.end() &&
-                std::regex_search(std::get<std::string>(*found->second), re,
-                                  std::regex_constants::match_continuous)) {
+            if (found != bag.end() && std::regex_search(std::get<std::string>(*found->second), re,
+                                                        std::regex_constants::match_continuous)) {
                 ++matches;
             }
         }

@@ -54,8 +54,8 @@ public:
             const std::string& name = run.run_name.function_name;
             auto keep = [&](double value, const char* unit) {
                 auto [at, added] = m_values.try_emplace(name, Value{{kNone, kNone, kNone}, unit});
-                double& slot = at->second.runs[static_cast<std::size_t>(
-                    run.repetition_index % kRuns)];
+                double& slot =
+                    at->second.runs[static_cast<std::size_t>(run.repetition_index % kRuns)];
                 slot = std::min(slot, value);
             };
             if (auto bytes = run.counters.find("bytes_per_object"); bytes != run.counters.end()) {
@@ -176,7 +176,9 @@ struct Row {
         return HasBaseline() ? ours[r] / baseline[r] : ours[r];
     }
     // Within the limit in every run measured (at least one).
-    bool WithinLimit() const { return Count([&](double v) { return v <= target->limit; }) == 0; }
+    bool WithinLimit() const {
+        return Count([&](double v) { return v <= target->limit; }) == 0;
+    }
     bool BeyondLimitInEveryRun() const {
         return Count([&](double v) { return v > target->limit; }) == Measured();
     }
@@ -254,7 +256,8 @@ int PrintTable(const CollectingReporter& results, const std::string& loadBefore)
         rows.push_back(Measure(t, results));
     }
     std::printf("\nCPU: %s, %ld logical CPUs\n",
-                ReadFirstLine("/proc/cpuinfo", "model name").c_str(), sysconf(_SC_NPROCESSORS_ONLN));
+                ReadFirstLine("/proc/cpuinfo", "model name").c_str(),
+                sysconf(_SC_NPROCESSORS_ONLN));
     std::printf("load average (1, 5, 15 min): %s before, %s after\n", loadBefore.c_str(),
                 Load().c_str());
     std::printf("ratios of %d interleaved runs; a goal is met only when it is met in each\n",

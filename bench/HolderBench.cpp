@@ -230,19 +230,29 @@ void BuildGeneric(benchmark::State& state) {
     SetItems(state, count);
 }
 
-// Heap bytes of one generic holder with sixteen int properties, the properties included.
+// Heap bytes one generic holder with sixteen int properties holds, the properties
+// included, as malloc rounds them.
 void GenericBytes(benchmark::State& state) {
     std::vector<Str> names;
     for (const std::string& text : SixteenNames()) {
         names.emplace_back(text);
     }
     for (auto _ : state) {
-        const std::uint64_t before = AllocatedBytes();
+        const std::int64_t before = LiveBytes();
+        std::vector<RefCountPtr<VnI::IProperty>> properties;
+        properties.reserve(16);
+        const std::int64_t vectorBytes = LiveBytes() - before;
+        for (int i = 0; i < 16; ++i) {
+            properties.push_back(Int(i));
+        }
+        const std::int64_t propertyBytes = LiveBytes() - before - vectorBytes;
         auto holder = std::make_unique<Vn::Eng::GenericPropertyHolder>();
         for (int i = 0; i < 16; ++i) {
-            holder->AddProperty(names[static_cast<size_t>(i)], Int(i));
+            holder->AddProperty(names[static_cast<size_t>(i)], properties[static_cast<size_t>(i)]);
         }
-        state.counters["bytes_per_object"] = static_cast<double>(AllocatedBytes() - before);
+        state.counters["bytes_per_object"] =
+            static_cast<double>(LiveBytes() - before - vectorBytes);
+        state.counters["property_bytes"] = static_cast<double>(propertyBytes);
     }
 }
 

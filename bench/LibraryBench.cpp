@@ -227,8 +227,7 @@ void RegisterLibraryBenchmarks() {
         ->Iterations(1);
     benchmark::RegisterBenchmark("bytes/selection_index_per_listed", IndexBytesPerListedItem, true)
         ->Iterations(1);
-    benchmark::RegisterBenchmark("bytes/highlight_index_per_listed", IndexBytesPerListedItem,
-                                 false)
+    benchmark::RegisterBenchmark("bytes/highlight_index_per_listed", IndexBytesPerListedItem, false)
         ->Iterations(1);
     benchmark::RegisterBenchmark("bytes/selection_per_holder", BytesPerSelectedHolder)
         ->Iterations(1);
