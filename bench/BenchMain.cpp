@@ -16,6 +16,7 @@
 #include <cstdio>
 #include <cstring>
 #include <fstream>
+#include <functional>
 #include <limits>
 #include <map>
 #include <string>
@@ -176,23 +177,22 @@ struct Row {
         return HasBaseline() ? ours[r] / baseline[r] : ours[r];
     }
     // Within the limit in every run measured (at least one).
-    bool WithinLimit() const {
-        return Count([&](double v) { return v <= target->limit; }) == 0;
-    }
+    bool WithinLimit() const { return Measured() > 0 && Count(&Row::Beyond) == 0; }
     bool BeyondLimitInEveryRun() const {
-        return Count([&](double v) { return v > target->limit; }) == Measured();
+        return Measured() > 0 && Count(&Row::Beyond) == Measured();
     }
-    template <class P> int Count(P&& failing) const {
+    bool Beyond(double ratio) const { return ratio > target->limit; }
+    static bool Any(const Row&, double) { return true; }
+    // The runs measured whose ratio satisfies test.
+    template <class Test> int Count(Test test) const {
         int n = 0;
         for (std::size_t r = 0; r < kRuns; ++r) {
             const double v = Ratio(r);
-            n += v == v && !failing(v) ? 1 : 0;
+            n += v == v && std::invoke(test, *this, v) ? 1 : 0;
         }
         return n;
     }
-    int Measured() const {
-        return Count([](double) { return false; });
-    }
+    int Measured() const { return Count(&Row::Any); }
     static double Best(const std::array<double, kRuns>& values) {
         return *std::min_element(values.begin(), values.end());
     }
@@ -241,7 +241,7 @@ std::string FormatRatios(const Row& row) {
         char cell[16];
         const double v = row.Ratio(r);
         if (v == v) {
-            std::snprintf(cell, sizeof cell, "%7.3f", v);
+            std::snprintf(cell, sizeof cell, v < 100 ? "%7.3f" : "%7.0f", v);
         } else {
             std::snprintf(cell, sizeof cell, "%7s", "-");
         }
