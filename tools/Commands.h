@@ -22,6 +22,9 @@ const Command& NgcStubCommand();
 const Command& NgcNewCommand();
 const Command& NgdSampleCommand();
 const Command& ProjectFilesCommand();
+const Command& PinsCheckCommand();
+const Command& PinsAssignCommand();
+const Command& PinsShowCommand();
 
 /// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
 int UsageError(const std::string& command, const std::string& why);
