@@ -124,6 +124,10 @@ const Target kTargets[] = {
      2.0, "per node: 1M within 2x of 10k"},
     {Kind::Goal, "GetTileSiteColor on a known name", "colour/GetTileSiteColor",
      "colour/unordered_map", 2.0, "within 2x of unordered_map"},
+    {Kind::Reference, "ports of a 100 MB yosys netlist: time", "design/ports_100mb",
+     "design/read_bytes_100mb", 0, "vs reading its bytes"},
+    {Kind::Reference, "  (peak memory of that read)", "design/ports_100mb_peak",
+     "design/read_bytes_100mb_peak", 0, "vs reading its bytes"},
 };
 
 struct Row {
@@ -213,6 +217,7 @@ int main(int argc, char** argv) {
     VnBench::RegisterBaselines();
     VnBench::RegisterLibraryBenchmarks();
     VnBench::RegisterHolderBenchmarks();
+    VnBench::RegisterDesignBenchmarks();
     VnBench::CollectingReporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     benchmark::Shutdown();
