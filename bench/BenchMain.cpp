@@ -159,6 +159,10 @@ const Target kTargets[] = {
      "generic/build_bags_16", 1.0, "no slower than a bag of 16"},
     {Kind::Reference, "  (the same build, absolute)", "generic/build_ours_16", nullptr, 1500.0,
      "1500 ns on the reference machine"},
+    {Kind::Reference, "ports of a 100 MB yosys netlist: time", "design/ports_100mb",
+     "design/read_bytes_100mb", 0, "vs reading its bytes"},
+    {Kind::Reference, "  (peak memory of that read)", "design/ports_100mb_peak",
+     "design/read_bytes_100mb_peak", 0, "vs reading its bytes"},
 };
 
 struct Row {
@@ -325,6 +329,7 @@ int main(int argc, char** argv) {
     VnBench::RegisterBaselines();
     VnBench::RegisterLibraryBenchmarks();
     VnBench::RegisterHolderBenchmarks();
+    VnBench::RegisterDesignBenchmarks();
     VnBench::CollectingReporter reporter;
     const std::string loadBefore = VnBench::Load();
     benchmark::RunSpecifiedBenchmarks(&reporter);

@@ -35,6 +35,7 @@ std::vector<std::string> SixteenNames();
 void RegisterBaselines();
 void RegisterLibraryBenchmarks();
 void RegisterHolderBenchmarks();
+void RegisterDesignBenchmarks();
 
 /// A per-call measurement: many short repetitions rather than a few long ones, so a burst
 /// of noise from a neighbour on a shared machine spoils few of them (the fastest counts).

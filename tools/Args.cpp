@@ -51,7 +51,7 @@ bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args
             error = "unknown option " + name;
             return false;
         }
-        if (out.Has(name)) {
+        if (out.Has(name) && !option->repeat) {
             error = "option " + name + " given twice";
             return false;
         }
@@ -71,6 +71,7 @@ bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args
             value = args[++i];
         }
         out.values[name] = value;
+        out.lists[name].push_back(value);
     }
     if (out.help) {
         return true;

@@ -22,6 +22,7 @@ struct OptionSyntax {
     std::string name;  ///< with the leading dashes, such as "--svg"
     std::string value; ///< placeholder of its value ("OUT"); empty for a flag
     std::string help;
+    bool repeat = false; ///< may be given more than once; see ParsedArgs::Values
 };
 
 struct CommandSyntax {
@@ -35,7 +36,8 @@ struct CommandSyntax {
 };
 
 struct ParsedArgs {
-    std::map<std::string, std::string> values;
+    std::map<std::string, std::string> values;             ///< the last value of a repeated option
+    std::map<std::string, std::vector<std::string>> lists; ///< every value, in order
     std::set<std::string> flags;
     std::vector<std::string> operands;
     bool help = false;
@@ -47,6 +49,10 @@ struct ParsedArgs {
     std::string Value(const std::string& name, const std::string& fallback = "") const {
         auto it = values.find(name);
         return it == values.end() ? fallback : it->second;
+    }
+    std::vector<std::string> Values(const std::string& name) const {
+        auto it = lists.find(name);
+        return it == lists.end() ? std::vector<std::string>{} : it->second;
     }
 };
 

@@ -2,8 +2,12 @@
 #pragma once
 
 #include "Args.h"
+#include "DeviceModel.h"
+#include "DeviceOptions.h"
 
+#include <memory>
 #include <string>
+#include <vector>
 
 namespace VnTool {
 
@@ -18,6 +22,9 @@ const Command& NgcStubCommand();
 const Command& NgcNewCommand();
 const Command& NgdSampleCommand();
 const Command& ProjectFilesCommand();
+const Command& PinsCheckCommand();
+const Command& PinsAssignCommand();
+const Command& PinsShowCommand();
 
 /// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
 int UsageError(const std::string& command, const std::string& why);
@@ -28,8 +35,12 @@ int Refused(const std::string& command, const std::string& why);
 /// must state its reason itself.
 int LibraryErrorCount();
 
-/// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
-/// then in share/venlomer beside the program's bin folder. Empty when not found.
-std::string FindDataFile(const std::string& name);
+/// --chipdb, --device and --package, as every device command declares them.
+std::vector<OptionSyntax> DeviceOptionSyntax();
+
+/// Resolves the device options of `args` and reads the chip database. Returns kExitOk
+/// with `model` set, or the status of the usage error or refusal it has reported.
+int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
+               std::unique_ptr<DeviceModel>& model);
 
 } // namespace VnTool

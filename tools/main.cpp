@@ -25,8 +25,9 @@ using VnTool::Command;
 
 const std::vector<const Command*>& AllCommands() {
     static const std::vector<const Command*> commands = {
-        &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),    &VnTool::NgcStubCommand(),
-        &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(), &VnTool::ProjectFilesCommand(),
+        &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),     &VnTool::NgcStubCommand(),
+        &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(),  &VnTool::ProjectFilesCommand(),
+        &VnTool::PinsCheckCommand(), &VnTool::PinsAssignCommand(), &VnTool::PinsShowCommand(),
     };
     return commands;
 }
@@ -121,6 +122,20 @@ int main(int argc, char** argv) {
     if (first == args.size()) {
         std::fprintf(stderr, "venlomer: no command given (see venlomer --help)\n");
         return VnTool::kExitUsage;
+    }
+    // The pins commands are two words: "pins check".
+    if (args[first] == "pins") {
+        if (first + 1 == args.size() || args[first + 1].empty() || args[first + 1][0] == '-') {
+            bool help =
+                first + 1 < args.size() && (args[first + 1] == "--help" || args[first + 1] == "-h");
+            std::fprintf(help ? stdout : stderr,
+                         "%susage: venlomer pins check|assign|show [options] (see venlomer pins "
+                         "COMMAND --help)\n",
+                         help ? "" : "venlomer pins: no pins command given; ");
+            return help ? VnTool::kExitOk : VnTool::kExitUsage;
+        }
+        args[first + 1] = "pins " + args[first + 1];
+        ++first;
     }
     const std::string& name = args[first];
     if (name == "--help" || name == "-h" || name == "help") {

@@ -132,7 +132,7 @@ TEST(Pcf, AMissingFileIsAnEmptyPlanOnlyWhenAskedFor) {
     PcfFile pcf;
     std::string error;
     EXPECT_FALSE(pcf.ParseFile("/nonexistent/p.pcf", error));
-    EXPECT_EQ(error, "/nonexistent/p.pcf: cannot open the constraint file");
+    EXPECT_EQ(error, "/nonexistent/p.pcf: cannot open: No such file or directory");
     EXPECT_TRUE(pcf.ParseFile("/nonexistent/p.pcf", error, true)) << error;
     EXPECT_EQ(pcf.Text(), "");
 }

@@ -22,14 +22,22 @@ using VnTool::Design;
 using VnTool::PcfFile;
 using VnTool::PinProblem;
 
-// The tiles of a whole width x height grid: IO tiles on the edges, logic inside, the
-// corners empty, as the reader wants a device's grid.
-std::string WholeGrid(int width, int height) {
+// A 6 x 6 device: pins 1-3 on the top edge (bank 0), 4-6 right (1), 7-8 bottom (2),
+// 9-10 left (3); pins 8 and 10 drive global buffers.
+const char kDevice[] = ".device t 6 6 0\n"
+                       ".pins p\n"
+                       "1 1 5 0\n2 2 5 0\n3 3 5 0\n4 5 2 0\n5 5 3 0\n6 5 3 1\n"
+                       "7 2 0 0\n8 3 0 1\n9 0 2 0\n10 0 3 1\n"
+                       ".gbufpin\n3 0 1 0\n0 3 1 1\n";
+
+// The chip-database reader takes only whole grids: IO tiles round the edge, logic inside,
+// no corners.
+std::string Tiles(int width, int height) {
     std::string text;
-    for (int y = 0; y < height; ++y) {
-        for (int x = 0; x < width; ++x) {
-            const bool edgeX = x == 0 || x == width - 1;
-            const bool edgeY = y == 0 || y == height - 1;
+    for (int x = 0; x < width; ++x) {
+        for (int y = 0; y < height; ++y) {
+            bool edgeX = x == 0 || x == width - 1;
+            bool edgeY = y == 0 || y == height - 1;
             if (edgeX && edgeY) {
                 continue;
             }
@@ -40,18 +48,9 @@ std::string WholeGrid(int width, int height) {
     return text;
 }
 
-// A 6 x 6 device: pins 1-3 on the top edge (bank 0), 4-6 right (1), 7-8 bottom (2),
-// 9-10 left (3); pins 8 and 10 drive global buffers.
-const std::string kDevice = ".device t 6 6 0\n"
-                            ".pins p\n"
-                            "1 1 5 0\n2 2 5 0\n3 3 5 0\n4 5 2 0\n5 5 3 0\n6 5 3 1\n"
-                            "7 2 0 0\n8 3 0 1\n9 0 2 0\n10 0 3 1\n"
-                            ".gbufpin\n3 0 1 0\n0 3 1 1\n" +
-                            WholeGrid(6, 6);
-
 ChipDb Device() {
     ChipDb db;
-    std::istringstream in(kDevice);
+    std::istringstream in(kDevice + Tiles(6, 6));
     std::string error;
     EXPECT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
     return db;
@@ -155,7 +154,7 @@ TEST(PinChecks, PinsAreCountedAsPeopleCountThem) {
     ChipDb db;
     std::istringstream in(".device t 4 4 0\n.pins p\nB1 0 1 0\nA10 0 2 0\nA2 0 1 1\n10 0 2 1\n"
                           "9 3 1 0\nA02 3 1 1\n" +
-                          WholeGrid(4, 4));
+                          Tiles(4, 4));
     std::string error;
     ASSERT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
     std::vector<std::string> names;

@@ -174,7 +174,7 @@ TEST(YosysPorts, BadInputIsRefusedInOneLineNamingFileAndLine) {
     Design design;
     std::string error;
     EXPECT_FALSE(VnTool::ReadYosysPortsFile("/nonexistent/top.json", design, error));
-    EXPECT_EQ(error, "/nonexistent/top.json: cannot open the netlist");
+    EXPECT_EQ(error, "/nonexistent/top.json: cannot open: No such file or directory");
 }
 
 } // namespace

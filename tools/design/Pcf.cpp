@@ -1,6 +1,8 @@
 //===-- tools/design/Pcf.cpp - pin constraint files as nextpnr-ice40 reads them --===//
 #include "Pcf.h"
 
+#include "Port/SafeFile.h"
+
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -9,6 +11,9 @@
 namespace VnTool {
 
 namespace {
+
+// A constraint file is a few kilobytes; one of megabytes is some other file named by mistake.
+constexpr std::uint64_t kMaxPcfBytes = std::uint64_t{16} << 20;
 
 struct Token {
     std::string_view text;
@@ -116,24 +121,18 @@ bool PcfFile::Parse(std::string_view text, std::string_view source, std::string&
 }
 
 bool PcfFile::ParseFile(const std::string& path, std::string& error, bool missingIsEmpty) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) {
-        std::error_code ec;
-        if (missingIsEmpty && !std::filesystem::exists(path, ec) && !ec) {
-            m_source = path;
-            m_lines.clear();
-            return true;
-        }
-        error = path + ": cannot open the constraint file";
+    std::error_code ec;
+    if (missingIsEmpty &&
+        std::filesystem::symlink_status(path, ec).type() == std::filesystem::file_type::not_found) {
+        m_source = path;
+        m_lines.clear();
+        return true;
+    }
+    std::string text;
+    if (!Port::ReadRegularFile(path, text, error, kMaxPcfBytes)) {
         return false;
     }
-    std::ostringstream text;
-    text << in.rdbuf();
-    if (in.bad()) {
-        error = path + ": read error";
-        return false;
-    }
-    return Parse(text.str(), path, error);
+    return Parse(text, path, error);
 }
 
 std::string PcfFile::Text() const {

@@ -59,7 +59,9 @@ bool NaturalLess(const std::string& a, const std::string& b) {
 }
 
 std::string Where(const PcfFile& pcf, const PcfLine& line) {
-    return pcf.Source() + ":" + std::to_string(line.number);
+    // A line the tool is about to add has no number yet.
+    return line.number == 0 ? pcf.Source() + " (new line)"
+                            : pcf.Source() + ":" + std::to_string(line.number);
 }
 
 void Add(std::vector<PinProblem>& problems, PinProblem::Severity severity, const std::string& where,

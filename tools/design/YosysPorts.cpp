@@ -1,6 +1,8 @@
 //===-- tools/design/YosysPorts.cpp - the top-level ports of a yosys netlist -----===//
 #include "YosysPorts.h"
 
+#include "Port/SafeFile.h"
+
 #include <nlohmann/json.hpp>
 
 #include <cstddef>
@@ -539,12 +541,19 @@ bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, s
 }
 
 bool ReadYosysPortsFile(const std::string& path, Design& design, std::string& error) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) {
-        error = path + ": cannot open the netlist";
+    Port::InputFile in;
+    if (!in.Open(path, error)) {
         return false;
     }
-    return ReadYosysPorts(in, path, design, error);
+    if (!ReadYosysPorts(in.Stream(), path, design, error)) {
+        // A read that stopped at the size limit or an I/O error says so, not "truncated".
+        std::string why;
+        if (in.Failed(why)) {
+            error = why;
+        }
+        return false;
+    }
+    return true;
 }
 
 } // namespace VnTool

@@ -1,0 +1,450 @@
+//===-- tools/Pins.cpp - venlomer pins check|assign|show: plan a design's pins ----===//
+//
+// The road from a yosys netlist to a constraint file nextpnr-ice40 accepts: the ports of
+// the design, the pins of the device model, the checks of the plan, and the file written
+// through the safe writer only when the plan it holds has no error.
+//
+//===------------------------------------------------------------------------------===//
+#include "Commands.h"
+#include "DeviceDraw.h"
+#include "DeviceSearch.h"
+#include "PinPlan.h"
+#include "PortHolders.h"
+
+#include "Port/SafeFile.h"
+
+#include <cstdio>
+#include <filesystem>
+#include <limits>
+#include <map>
+#include <set>
+
+namespace VnTool {
+
+namespace {
+
+const char kCheck[] = "pins check";
+const char kAssign[] = "pins assign";
+const char kShow[] = "pins show";
+
+// What every pins command reads.
+struct Plan {
+    DeviceSource source;
+    std::unique_ptr<DeviceModel> model;
+    std::string designPath;
+    std::string pcfPath;
+    Design design;
+    PcfFile pcf;
+    bool pcfExisted = true;
+};
+
+int Load(const std::string& command, const ParsedArgs& args, bool missingPcfIsEmpty, Plan& plan) {
+    plan.designPath = args.Value("--design");
+    plan.pcfPath = args.Value("--pcf");
+    if (plan.designPath.empty()) {
+        return UsageError(command, "--design D.json is needed (yosys -p \"synth_ice40 -top top "
+                                   "-json D.json\" makes one)");
+    }
+    if (plan.pcfPath.empty()) {
+        return UsageError(command, "--pcf P.pcf is needed");
+    }
+    if (int status = OpenDevice(command, args, plan.source, plan.model); status != kExitOk) {
+        return status;
+    }
+    // The constraint file is the one file a pins command may write: it must never be one
+    // of the files it reads as something else.
+    std::error_code ec;
+    for (const std::string& input : {plan.designPath, plan.source.chipDb}) {
+        if (std::filesystem::equivalent(plan.pcfPath, input, ec) && !ec) {
+            return Refused(command, plan.pcfPath + " is " + input +
+                                        ", not a constraint file; give the .pcf file to --pcf");
+        }
+    }
+    std::string error;
+    if (!ReadYosysPortsFile(plan.designPath, plan.design, error)) {
+        return Refused(command, error);
+    }
+    plan.pcfExisted = std::filesystem::exists(std::filesystem::symlink_status(plan.pcfPath, ec));
+    if (!plan.pcf.ParseFile(plan.pcfPath, error, missingPcfIsEmpty)) {
+        return Refused(command, error);
+    }
+    return kExitOk;
+}
+
+void PrintDevice(const Plan& plan) {
+    if (!plan.source.note.empty()) {
+        std::printf("Note: %s\n", plan.source.note.c_str());
+    }
+    const ChipDb& db = plan.model->Db();
+    std::printf("Device %s, package %s: %zu pins; design %s (top %s): %zu ports\n",
+                db.device.c_str(), db.package.empty() ? "(none)" : db.package.c_str(),
+                db.pins.size(), plan.designPath.c_str(), plan.design.top.c_str(),
+                plan.design.ports.size());
+}
+
+std::string Count(std::size_t n, const char* one, const char* many) {
+    return std::to_string(n) + " " + (n == 1 ? one : many);
+}
+
+int Errors(const std::vector<PinProblem>& problems) {
+    int errors = 0;
+    for (const auto& problem : problems) {
+        errors += problem.severity == PinProblem::Severity::Error ? 1 : 0;
+    }
+    return errors;
+}
+
+// A file that is no constraint file at all gives an error per line; the first screenful
+// tells as much as all of them.
+void PrintProblems(const std::vector<PinProblem>& problems) {
+    const std::size_t shown = 40;
+    for (std::size_t i = 0; i < problems.size() && i < shown; ++i) {
+        std::printf("%s\n", Port::Printable(problems[i].message).c_str());
+    }
+    if (problems.size() > shown) {
+        std::printf("... and %zu more\n", problems.size() - shown);
+    }
+}
+
+// ---- check -----------------------------------------------------------------------------
+
+int RunCheck(const ParsedArgs& args) {
+    Plan plan;
+    if (int status = Load(kCheck, args, false, plan); status != kExitOk) {
+        return status;
+    }
+    bool strict = args.Has("--strict");
+    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, plan.pcf, strict);
+    PrintDevice(plan);
+
+    // The table is read from the ports' holders, as the editor's port list is.
+    PortHolders ports(plan.design);
+    ports.ApplyPins(plan.model->Db(), plan.pcf);
+    std::vector<std::vector<std::string>> rows;
+    std::size_t placed = 0;
+    for (VnI::IPropertyHolder* holder : ports.List()) {
+        std::string name = holder->GetName().str();
+        std::string pin = ValueText(holder->GetPropertyByName("Pin"));
+        std::string bank = ValueText(holder->GetPropertyByName("Bank"));
+        int errors = 0;
+        int warnings = 0;
+        for (const auto& problem : problems) {
+            if (problem.port == name) {
+                (problem.severity == PinProblem::Severity::Error ? errors : warnings) += 1;
+            }
+        }
+        std::string said;
+        if (errors > 0) {
+            said = Count(static_cast<std::size_t>(errors), "error", "errors");
+        }
+        if (warnings > 0) {
+            said += (said.empty() ? "" : ", ") +
+                    Count(static_cast<std::size_t>(warnings), "warning", "warnings");
+        }
+        placed += pin.empty() ? 0 : 1;
+        rows.push_back({name, ValueText(holder->GetPropertyByName("Direction")),
+                        ValueText(holder->GetPropertyByName("Clock")), pin.empty() ? "-" : pin,
+                        bank == "-1" ? "-" : bank, said.empty() ? "ok" : said});
+    }
+    PrintTable({"Port", "Direction", "Clock", "Pin", "Bank", "Problems"}, rows);
+    PrintProblems(problems);
+    int errors = Errors(problems);
+    std::printf(
+        "%s: %zu on pins, %zu without; %s, %s\n", Count(ports.Size(), "port", "ports").c_str(),
+        placed, ports.Size() - placed,
+        Count(static_cast<std::size_t>(errors), "error", "errors").c_str(),
+        Count(problems.size() - static_cast<std::size_t>(errors), "warning", "warnings").c_str());
+    return errors > 0 ? kExitRefused : kExitOk;
+}
+
+// ---- assign ----------------------------------------------------------------------------
+
+int RunAssign(const ParsedArgs& args) {
+    std::vector<std::pair<std::string, std::string>> wanted;
+    for (const std::string& operand : args.operands) {
+        auto eq = operand.find('=');
+        if (eq == std::string::npos || eq == 0 || eq + 1 == operand.size()) {
+            return UsageError(kAssign, "an assignment is PORT=PIN, got \"" + operand + "\"");
+        }
+        wanted.emplace_back(operand.substr(0, eq), operand.substr(eq + 1));
+    }
+    std::vector<std::string> unassign = args.Values("--unassign");
+    bool autoAssign = args.Has("--auto");
+    if (wanted.empty() && unassign.empty() && !autoAssign) {
+        return UsageError(kAssign, "nothing to do: give PORT=PIN, --unassign PORT or --auto");
+    }
+    Plan plan;
+    if (int status = Load(kAssign, args, true, plan); status != kExitOk) {
+        return status;
+    }
+    const ChipDb& db = plan.model->Db();
+    std::set<std::string> designPorts;
+    for (const auto& port : plan.design.ports) {
+        designPorts.insert(port.name);
+    }
+    auto refuse = [&](const std::string& why) {
+        return Refused(kAssign, why + "; " + plan.pcfPath + " left untouched");
+    };
+    for (const auto& [port, pin] : wanted) {
+        if (designPorts.count(port) == 0) {
+            return refuse("design " + plan.designPath + " has no port '" + port + "'");
+        }
+        if (plan.model->FindPin(pin) == nullptr) {
+            return refuse("pin '" + pin + "' is not in package " + db.package + " of device " +
+                          db.device);
+        }
+    }
+    PcfFile result = plan.pcf;
+    for (const std::string& port : unassign) {
+        if (result.Unassign(port) == 0) {
+            return refuse("port '" + port + "' has no set_io line to remove");
+        }
+    }
+    for (const auto& [port, pin] : wanted) {
+        result.Assign(port, pin);
+    }
+    std::vector<std::pair<std::string, std::string>> given;
+    if (autoAssign) {
+        given = AutoAssign(db, plan.design, result);
+    }
+
+    auto problems = CheckPins(db, plan.design, plan.designPath, result, false);
+    if (HasErrors(problems)) {
+        // One line: the first error, which names its file and line.
+        std::string first;
+        for (const auto& problem : problems) {
+            if (first.empty() && problem.severity == PinProblem::Severity::Error) {
+                first = problem.message;
+            }
+        }
+        int more = Errors(problems) - 1;
+        return refuse(first + (more > 0 ? " (and " +
+                                              Count(static_cast<std::size_t>(more), "more error",
+                                                    "more errors") +
+                                              "; venlomer pins check lists them)"
+                                        : ""));
+    }
+    PrintDevice(plan);
+    for (const std::string& port : unassign) {
+        std::printf("  %s: unassigned\n", port.c_str());
+    }
+    auto describe = [&](const std::string& port, const std::string& pin) {
+        DeviceHolder* holder = plan.model->FindPin(pin);
+        std::printf("  %s -> %s (bank %d%s)\n", port.c_str(), pin.c_str(),
+                    plan.model->PinOf(holder).bank,
+                    plan.model->IsGlobalBufferPin(holder) ? ", global buffer" : "");
+    };
+    for (const auto& [port, pin] : wanted) {
+        describe(port, pin);
+    }
+    for (const auto& [port, pin] : given) {
+        describe(port, pin);
+    }
+    PrintProblems(problems);
+    std::string text = result.Text();
+    if (plan.pcfExisted && text == plan.pcf.Text()) {
+        std::printf("%s unchanged\n", plan.pcfPath.c_str());
+        return kExitOk;
+    }
+    std::string error;
+    if (!Port::WriteFileSafely(plan.pcfPath, text, error, {plan.designPath, plan.source.chipDb})) {
+        return Refused(kAssign, error);
+    }
+    std::size_t lines = 0;
+    for (const auto& line : result.Lines()) {
+        lines += line.kind == PcfLine::Kind::SetIo ? 1 : 0;
+    }
+    std::printf("%s %s: %s\n", plan.pcfExisted ? "Updated" : "Created", plan.pcfPath.c_str(),
+                Count(lines, "set_io line", "set_io lines").c_str());
+    return kExitOk;
+}
+
+// ---- show ------------------------------------------------------------------------------
+
+int RunShow(const ParsedArgs& args) {
+    SearchRequest search;
+    if (int status = ParseSearchArgs(kShow, args, search); status != kExitOk) {
+        return status;
+    }
+    DrawRequest draw;
+    draw.plan = true;
+    draw.highlightOnly = args.Has("--highlight-only");
+    draw.svg = args.Value("--svg", "pins.svg");
+    if (draw.svg.empty()) {
+        return UsageError(kShow, "--svg wants a file name");
+    }
+    Plan plan;
+    if (int status = Load(kShow, args, false, plan); status != kExitOk) {
+        return status;
+    }
+    DeviceModel& model = *plan.model;
+    PortHolders ports(plan.design);
+    ports.ApplyPins(model.Db(), plan.pcf);
+    std::vector<SearchKind> kinds = {
+        {model.PinNames(), "Pins"}, {model.BankNames(), "Banks"}, {ports.Names(), "Ports"}};
+    CommonI::RefCountPtr<VnI::IProperty> wanted;
+    if (search.active) {
+        if (int status = MakeWanted(kShow, search, kinds, "pins, banks and ports",
+                                    "Name, Bank, Tile, X, Y, Block, Edge, Pins, Direction, Bit, "
+                                    "Clock, Pin",
+                                    wanted);
+            status != kExitOk) {
+            return status;
+        }
+    }
+    auto problems = CheckPins(model.Db(), plan.design, plan.designPath, plan.pcf, false);
+    PrintDevice(plan);
+
+    auto pinIndex = [&](const std::string& pin) {
+        DeviceHolder* holder = model.FindPin(pin);
+        return holder != nullptr ? holder->GetIndex() : -1;
+    };
+    for (const auto& line : plan.pcf.Lines()) {
+        int index = line.kind == PcfLine::Kind::SetIo && ports.Find(line.port) != nullptr
+                        ? pinIndex(line.pin)
+                        : -1;
+        if (index >= 0) {
+            PinMark& mark = draw.marks[index];
+            mark.label += (mark.label.empty() ? "" : ",") + line.port;
+        }
+    }
+    for (const auto& problem : problems) {
+        std::string pin = problem.pin;
+        if (pin.empty() && ports.Find(problem.port) != nullptr) {
+            pin = ValueText(ports.Find(problem.port)->GetPropertyByName("Pin"));
+        }
+        int index = pinIndex(pin);
+        if (index < 0) {
+            continue;
+        }
+        PinMark& mark = draw.marks[index];
+        if (mark.status != PinMark::Status::Problem) {
+            mark.status = PinMark::Status::Problem;
+            mark.reason = problem.message;
+        }
+        if (mark.label.empty()) {
+            mark.label = problem.port;
+        }
+    }
+    std::size_t problemPins = 0;
+    for (const auto& [index, mark] : draw.marks) {
+        problemPins += mark.status == PinMark::Status::Problem ? 1 : 0;
+    }
+    std::printf("Pins: %zu assigned, %zu with problems, %zu free\n",
+                draw.marks.size() - problemPins, problemPins,
+                model.Pins().size() - draw.marks.size());
+    PrintProblems(problems);
+    if (search.active) {
+        std::vector<VnI::IPropertyHolder*> candidates(model.Banks().begin(), model.Banks().end());
+        candidates.insert(candidates.end(), model.Pins().begin(), model.Pins().end());
+        for (VnI::IPropertyHolder* port : ports.List()) {
+            candidates.push_back(port);
+        }
+        std::string over = std::to_string(model.Banks().size()) + " banks, " +
+                           std::to_string(model.Pins().size()) + " pins and " +
+                           std::to_string(ports.Size()) + " ports";
+        auto matches = SearchAndPrint(search, wanted, candidates, kinds, over);
+        // A matched port stands for the pin it is on: the device's managers hold device
+        // resources only.
+        std::vector<VnI::IPropertyHolder*> resources;
+        for (VnI::IPropertyHolder* match : matches) {
+            if (match->GetPropertyNames() != ports.Names()) {
+                resources.push_back(match);
+            } else if (DeviceHolder* pin =
+                           model.FindPin(ValueText(match->GetPropertyByName("Pin")))) {
+                resources.push_back(pin);
+            }
+        }
+        SelectAndHighlight(model, resources);
+        draw.title = ", search " + search.name + "=" + search.value;
+    }
+    draw.inputs = {plan.source.chipDb, plan.designPath, plan.pcfPath};
+    return DrawDevice(kShow, model, draw);
+}
+
+std::vector<OptionSyntax> PlanOptions() {
+    std::vector<OptionSyntax> options = {
+        {"--design", "D.json", "the yosys netlist (synth_ice40 ... -json D.json)"},
+        {"--pcf", "P.pcf", "the pin constraint file"},
+    };
+    for (const OptionSyntax& option : DeviceOptionSyntax()) {
+        options.push_back(option);
+    }
+    return options;
+}
+
+const char kDeviceDetails[] =
+    "Without --chipdb or --device, chipdb-8k.txt (package ct256) is taken from\n"
+    "/usr/share/fpga-icestorm/chipdb (or the folder in VENLOMER_CHIPDB_DIR), else the\n"
+    "bundled demo device. --device 1k means chipdb-1k.txt there (package tq144 unless\n"
+    "--package says otherwise).\n"
+    "Exit status: 0 success, 1 refused or problems found, 2 bad usage.\n";
+
+} // namespace
+
+const Command& PinsCheckCommand() {
+    static const Command command = [] {
+        auto options = PlanOptions();
+        options.push_back({"--strict", "", "a port left without a pin is an error"});
+        return Command{{kCheck, "", "check a design's pin constraints against the device", options,
+                        0, 0,
+                        std::string("Prints a table of the design's ports with pin, bank and "
+                                    "problems, then each problem\nas FILE:LINE: error|warning: "
+                                    "WHY. Exits 1 on any error.\n") +
+                            kDeviceDetails +
+                            "Example: venlomer pins check --design top.json --pcf top.pcf "
+                            "--device 1k --package tq144\n"},
+                       RunCheck};
+    }();
+    return command;
+}
+
+const Command& PinsAssignCommand() {
+    static const Command command = [] {
+        auto options = PlanOptions();
+        options.push_back(
+            {"--unassign", "PORT", "drop the port's set_io lines (repeatable)", true});
+        options.push_back({"--auto", "", "give every port without a pin a free pin"});
+        return Command{
+            {kAssign, "[PORT=PIN ...]", "put design ports on pins and write the constraint file",
+             options, 0, std::numeric_limits<std::size_t>::max(),
+             std::string("Removes, then assigns, then (with --auto) fills in: clock ports on "
+                         "global-buffer\npins, each bus together in one bank in pin order, then "
+                         "the rest. The file is\nwritten (created when absent) only when the "
+                         "resulting plan has no error; lines\nthe tool does not own stay as "
+                         "they are. Otherwise it is left untouched and\nthe errors are "
+                         "printed.\n") +
+                 kDeviceDetails +
+                 "Example: venlomer pins assign --design top.json --pcf top.pcf --device 1k "
+                 "clk=21 --auto\n"},
+            RunAssign};
+    }();
+    return command;
+}
+
+const Command& PinsShowCommand() {
+    static const Command command = [] {
+        auto options = PlanOptions();
+        for (const OptionSyntax& option : SearchOptionSyntax()) {
+            options.push_back(option);
+        }
+        options.back().help = "compare flags of the search, comma separated";
+        options[options.size() - 2].help = "search the banks, pins and ports for a value";
+        options.push_back({"--svg", "OUT", "where to write the picture (default: pins.svg)"});
+        options.push_back({"--highlight-only", "", "draw only the pins the search highlighted"});
+        return Command{
+            {kShow, "", "draw the device with the design's pins labelled and coloured by status",
+             options, 0, 0,
+             std::string("Assigned pins carry their port's name; pins with a problem are drawn "
+                         "in the\nproblem colour, free pins in their bank's colour. Searchable "
+                         "like floorplan;\nports have Name, Direction, Bit, Clock, Pin, Bank, "
+                         "and a matched port\nhighlights its pin.\n") +
+                 kDeviceDetails +
+                 "Example: venlomer pins show --design top.json --pcf top.pcf --find "
+                 "Name=led --flags substring --svg pins.svg\n"},
+            RunShow};
+    }();
+    return command;
+}
+
+} // namespace VnTool
