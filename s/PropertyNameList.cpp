@@ -57,10 +57,68 @@ struct Record {
     explicit Record(PropertyNameList* owner) : m_xIPropertyNameList(owner) {}
 
     PropertyNameList_IPropertyNameList m_xIPropertyNameList;
+    // Empty until a name object is first asked for (by position or through an iterator):
+    // most lists are only ever asked for positions, and the index alone answers those.
+    // From then on it holds one counted name per position, and names are made as added.
     PropertyNameItr::Names names;
     detail::NameIndex m_nameIndex;
     std::int32_t m_numVisibleNames = 0;
+    bool m_namesMade = false;
 };
+
+namespace {
+
+// The byte the index keeps with each text: the type in the low seven bits and the
+// visibility in the top one. A name whose type does not fit, or that has possible values,
+// is made at once instead (kMadeAtOnce).
+constexpr std::uint8_t kVisibleBit = 0x80;
+constexpr std::uint8_t kMadeAtOnce = 0x7F;
+
+std::uint8_t Packed(VnI::PropertyType type, bool visible) {
+    const bool fits = type >= 0 && type < kMadeAtOnce;
+    return static_cast<std::uint8_t>((fits ? static_cast<std::uint8_t>(type) : kMadeAtOnce) |
+                                     (visible ? kVisibleBit : 0));
+}
+
+// Makes the names of the positions `names` lacks from the texts and bytes of index.
+// Throws, leaving names as it was, when one cannot be made.
+void MakeMissingNames(const detail::NameIndex& index, PropertyNameItr::Names& names) {
+    PropertyNameItr::Names made;
+    made.reserve(index.Size());
+    made = names;
+    for (std::size_t position = names.size(); position < index.Size(); ++position) {
+        const std::string_view text = index.Text(position);
+        const std::uint8_t packed = index.Extra(position);
+        auto name = PropertyName::CreateInstance(
+            Port::StringBase<char>(text.data(), static_cast<unsigned int>(text.size())),
+            static_cast<VnI::PropertyType>(packed & ~kVisibleBit), (packed & kVisibleBit) != 0);
+        if (!name) {
+            throw std::bad_alloc();
+        }
+        made.push_back(std::move(name));
+    }
+    names.swap(made);
+}
+
+// Whether a name must be made when added rather than on first request: its type does not
+// fit the packed byte, or it has possible values to copy now (the caller's iterator
+// is read as it stands at this call).
+bool MadeAtOnce(VnI::PropertyType type,
+                const CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>& values) {
+    return (Packed(type, false) & ~kVisibleBit) == kMadeAtOnce || (values && !values->IsEnd());
+}
+
+} // namespace
+
+// Every name object made, so they can be handed out; the list then makes each new name
+// as it is added.
+void MakeNames(Record& record) {
+    if (record.m_namesMade) {
+        return;
+    }
+    MakeMissingNames(record.m_nameIndex, record.names);
+    record.m_namesMade = true;
+}
 
 } // namespace PropertyNameListImp
 
@@ -81,17 +139,20 @@ CitI::IInterface* PropertyNameList::GetInterface(const Port::XUID& id) {
 }
 
 int PropertyNameList::GetNumNames() const {
-    return static_cast<int>(m_imp->names.size());
+    return static_cast<int>(m_imp->m_nameIndex.Size());
 }
 
 VnI::IPropertyName* PropertyNameList::GetPropertyName(int position) {
     if (position < 0 || position >= GetNumNames()) {
         return nullptr;
     }
+    PropertyNameListImp::MakeNames(*m_imp);
     return m_imp->names[static_cast<std::size_t>(position)].Get();
 }
 
 CommonI::RefCountPtr<VnI::IPropertyNameItr> PropertyNameList::GetNameItr() const {
+    // The iterator reads the vector in place, so from now on it must hold every name.
+    PropertyNameListImp::MakeNames(*m_imp);
     return PropertyNameItr::CreateInstance(&m_imp->names);
 }
 
@@ -110,6 +171,16 @@ int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::Prope
     if (Contains(name) != -1) {
         return -1;
     }
+    auto& record = *m_imp;
+    if (!record.m_namesMade && PropertyNameListImp::MadeAtOnce(type, values)) {
+        PropertyNameListImp::MakeNames(record);
+    }
+    if (!record.m_namesMade) {
+        const std::uint32_t position =
+            record.m_nameIndex.Append(name.view(), PropertyNameListImp::Packed(type, visible));
+        record.m_numVisibleNames += visible ? 1 : 0;
+        return static_cast<int>(position);
+    }
     auto created = PropertyName::CreateInstance(name, type, values, visible);
     if (!created) {
         return -1;
@@ -117,18 +188,17 @@ int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::Prope
     // Either structure may fail to grow. The vector goes first because taking its last
     // element back cannot fail; an index that kept a name the vector lacks would put
     // every later name one position too high (and with it holder slots and indices).
-    auto& names = m_imp->names;
+    auto& names = record.names;
     names.push_back(std::move(created));
     std::uint32_t position = 0;
     try {
-        position = m_imp->m_nameIndex.Append(name.view());
+        position =
+            record.m_nameIndex.Append(name.view(), PropertyNameListImp::Packed(type, visible));
     } catch (...) {
         names.pop_back();
         throw;
     }
-    if (visible) {
-        ++m_imp->m_numVisibleNames;
-    }
+    record.m_numVisibleNames += visible ? 1 : 0;
     return static_cast<int>(position);
 }
 
@@ -146,6 +216,7 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
     // itself) can never invalidate the walk; they are skipped as already present anyway.
     PropertyNameItr::Names staged = m_imp->names;
     detail::NameIndex index = m_imp->m_nameIndex;
+    bool made = m_imp->m_namesMade;
     std::int32_t visible = m_imp->m_numVisibleNames;
     for (names->First(); !names->IsEnd(); names->Next()) {
         VnI::IPropertyName* name = names->CurrentItem();
@@ -158,23 +229,35 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
         }
         const VnI::PropertyType type = name->GetType();
         const auto values = name->GetPossibleValues();
-        auto created = PropertyName::CreateInstance(text, type, values, name->IsVisible());
-        // A name that could not be made, or an enumerated one whose values could not be
-        // read, fails the whole call rather than going in wrong or not at all.
-        if (!created || (type == VnI::ENUM_TYPE && !values)) {
-            throw std::bad_alloc(); // a name skipped would shift every later position
+        // An enumerated name whose values could not be read fails the whole call rather
+        // than going in wrong; a skipped name would shift every later position.
+        if (type == VnI::ENUM_TYPE && !values) {
+            throw std::bad_alloc();
         }
-        staged.push_back(std::move(created));
-        index.Append(text.view());
-        visible += name->IsVisible() ? 1 : 0;
+        const bool isVisible = name->IsVisible();
+        if (!made && PropertyNameListImp::MadeAtOnce(type, values)) {
+            PropertyNameListImp::MakeMissingNames(index, staged);
+            made = true;
+        }
+        if (made) {
+            auto created = PropertyName::CreateInstance(text, type, values, isVisible);
+            if (!created) {
+                throw std::bad_alloc();
+            }
+            staged.push_back(std::move(created));
+        }
+        index.Append(text.view(), PropertyNameListImp::Packed(type, isVisible));
+        visible += isVisible ? 1 : 0;
     }
     m_imp->names.swap(staged);
     m_imp->m_nameIndex.Swap(index);
+    m_imp->m_namesMade = made;
     m_imp->m_numVisibleNames = visible;
     return 1;
 }
 
 std::int64_t PropertyNameList::ClearList() {
+    // Names stay made from now on: an iterator handed out before reads the vector.
     m_imp->names.clear();
     m_imp->m_nameIndex.Clear();
     m_imp->m_numVisibleNames = 0;

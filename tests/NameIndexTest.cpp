@@ -102,3 +102,88 @@ TEST(NameIndex, NamesWhoseHashesCollideStayApart) {
     EXPECT_EQ(index.Find("nctmsx"), 0);
     EXPECT_EQ(index.Find("nzmaos"), 1);
 }
+
+namespace {
+
+// Names a user meets and the ones that trip an index up: empty, NUL bytes inside and at
+// the end, heads shared up to eight bytes, long names, names that differ in their last
+// byte only. `count` of them, all distinct.
+std::vector<std::string> AwkwardNames(std::size_t count) {
+    std::vector<std::string> names;
+    for (std::size_t i = 0; names.size() < count; ++i) {
+        switch (i % 6) {
+        case 0:
+            names.push_back("P" + std::to_string(i));
+            break;
+        case 1:
+            names.push_back(std::string("a\0", 2) + std::to_string(i));
+            break;
+        case 2:
+            names.push_back("Highlight Color " + std::to_string(i));
+            break;
+        case 3:
+            names.push_back(std::string(300, 'x') + std::to_string(i));
+            break;
+        case 4:
+            names.push_back(std::to_string(i) + std::string(1, '\0'));
+            break;
+        default:
+            names.push_back(i == 5 ? std::string() : "12345678" + std::to_string(i));
+            break;
+        }
+    }
+    return names;
+}
+
+} // namespace
+
+// Small lists are scanned and larger ones hashed; the answers must not depend on which.
+// Every size around the change is checked, in a bare index and in a list.
+TEST(NameIndex, ScannedAndHashedListsGiveTheSameAnswers) {
+    using Vn::Eng::detail::NameIndex;
+    for (std::size_t count :
+         {std::size_t{1}, NameIndex::kScanLimit - 1, NameIndex::kScanLimit,
+          NameIndex::kScanLimit + 1, 2 * NameIndex::kScanLimit + 1, std::size_t{200}}) {
+        SCOPED_TRACE(count);
+        const auto names = AwkwardNames(count);
+        Vn::Eng::PropertyNameList list;
+        NameIndex index;
+        for (std::size_t i = 0; i < count; ++i) {
+            ASSERT_EQ(list.AddName(Str(names[i]), VnI::INT_TYPE, true), static_cast<int>(i));
+            ASSERT_EQ(index.Append(names[i], static_cast<std::uint8_t>(i)), i);
+        }
+        EXPECT_EQ(index.HasTable(), count > NameIndex::kScanLimit);
+        for (std::size_t i = 0; i < count; ++i) {
+            const std::string& name = names[i];
+            EXPECT_EQ(list.Contains(Str(name)), static_cast<int>(i)) << i;
+            EXPECT_EQ(index.Find(name), static_cast<int>(i)) << i;
+            EXPECT_EQ(index.Text(i), name) << i;
+            EXPECT_EQ(index.Extra(i), static_cast<std::uint8_t>(i)) << i;
+            // A duplicate is refused and changes nothing.
+            EXPECT_EQ(list.AddName(Str(name), VnI::STRING_TYPE, false), -1) << i;
+            // Near misses: one byte more, one less, one changed.
+            EXPECT_EQ(list.Contains(Str(name + 'z')), -1) << i;
+            if (!name.empty()) {
+                std::string changed = name;
+                changed.back() = static_cast<char>(changed.back() ^ 1);
+                EXPECT_EQ(list.Contains(Str(changed)), -1) << i;
+                const std::string shorter = name.substr(0, name.size() - 1);
+                const auto at = std::find(names.begin(), names.end(), shorter);
+                EXPECT_EQ(index.Find(shorter),
+                          at == names.end() ? -1 : static_cast<int>(at - names.begin()))
+                    << i;
+            }
+        }
+        EXPECT_EQ(list.GetNumNames(), static_cast<int>(count));
+        // The names made on request carry every byte of their texts.
+        for (std::size_t i = 0; i < count; ++i) {
+            ASSERT_NE(list.GetPropertyName(static_cast<int>(i)), nullptr);
+            EXPECT_EQ(list.GetPropertyName(static_cast<int>(i))->GetName().view(), names[i]) << i;
+        }
+        // A copy keeps answering after the original is cleared.
+        NameIndex copy = index;
+        index.Clear();
+        EXPECT_EQ(index.Find(names[0]), -1);
+        EXPECT_EQ(copy.Find(names[count - 1]), static_cast<int>(count - 1));
+    }
+}

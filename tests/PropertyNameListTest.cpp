@@ -404,3 +404,83 @@ TEST(PropertyNameSlots, FollowThePublishedOrder) {
     EXPECT_EQ(SlotOf(&PropertyNameList::GetNumNames), -1);
     EXPECT_EQ(SlotOf(&PropertyNameItr::CurrentItem), 3);
 }
+
+// A list makes its name objects only when one is first asked for; whatever the order of
+// adding and asking, each name must then report what it was added with.
+TEST(PropertyNameList, NamesMadeOnRequestReportWhatTheyWereAddedWith) {
+    const auto odd = static_cast<VnI::PropertyType>(200); // beyond the packed byte
+    const auto negative = static_cast<VnI::PropertyType>(-1);
+    for (bool askEarly : {false, true}) {
+        SCOPED_TRACE(askEarly);
+        PropertyNameList list;
+        auto& api = *static_cast<IPropertyNameList*>(list.GetInterface(VnI::IID_IPropertyNameList));
+        ASSERT_EQ(api.AddName("Bank", VnI::INT_TYPE, false), 0);
+        ASSERT_EQ(api.AddName(Port::StringBase<char>("N\0ul", 4), VnI::COLOR_TYPE, true), 1);
+        RefCountPtr<IPropertyNameItr> early;
+        if (askEarly) {
+            early = api.GetNameItr(); // handed out before the rest are added
+        }
+        ASSERT_EQ(api.AddName("Odd", odd, true), 2);
+        ASSERT_EQ(api.AddName("Negative", negative, false), 3);
+        ASSERT_EQ(api.AddEnumName("Site", VnI::ENUM_TYPE,
+                                  PossibleEnumValuesItr::CreateInstance(&kAbc), true),
+                  4);
+        ASSERT_EQ(api.AddEnumName("NoValues", VnI::ENUM_TYPE, RefCountPtr<IPossibleEnumValuesItr>(),
+                                  false),
+                  5);
+        ASSERT_EQ(api.AddName("Last", VnI::DOUBLE_TYPE, true), 6);
+
+        const std::vector<std::string> texts{
+            "Bank", std::string("N\0ul", 4), "Odd", "Negative", "Site", "NoValues", "Last"};
+        const std::vector<VnI::PropertyType> types{VnI::INT_TYPE,   VnI::COLOR_TYPE, odd,
+                                                   negative,        VnI::ENUM_TYPE,  VnI::ENUM_TYPE,
+                                                   VnI::DOUBLE_TYPE};
+        const std::vector<bool> visible{false, true, true, false, true, false, true};
+        ASSERT_EQ(api.GetNumNames(), 7);
+        for (int i = 0; i < 7; ++i) {
+            IPropertyName* name = api.GetPropertyName(i);
+            ASSERT_NE(name, nullptr) << i;
+            EXPECT_EQ(name->GetName().view(), texts[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(name->GetType(), types[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(name->IsVisible(), visible[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(name->GetPossibleValues()->IsEnd(), i != 4) << i;
+            EXPECT_EQ(api.GetPropertyName(i), name) << "made once, lent again";
+        }
+        EXPECT_EQ(Values(api.GetPropertyName(4)->GetPossibleValues()),
+                  (std::vector<std::string>{"A", "B", "C"}));
+        if (early) {
+            int seen = 0;
+            for (early->First(); !early->IsEnd(); early->Next()) {
+                EXPECT_EQ(early->CurrentItem(), api.GetPropertyName(seen)) << seen;
+                ++seen;
+            }
+            EXPECT_EQ(seen, 7) << "names added after the iterator are reached";
+        }
+
+        // Appending into a list that has made no names yet copies every one faithfully,
+        // and the clear keeps the early iterator on the list's (now empty) names.
+        PropertyNameList copy;
+        auto& to = *static_cast<IPropertyNameList*>(copy.GetInterface(VnI::IID_IPropertyNameList));
+        ASSERT_EQ(to.AddName("Other", VnI::BOOL_TYPE, true), 0);
+        ASSERT_EQ(to.AppendList(&api), 1);
+        ASSERT_EQ(to.GetNumNames(), 8);
+        for (int i = 0; i < 7; ++i) {
+            IPropertyName* name = to.GetPropertyName(i + 1);
+            EXPECT_EQ(name->GetName().view(), texts[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(name->GetType(), types[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(name->IsVisible(), visible[static_cast<std::size_t>(i)]) << i;
+            EXPECT_EQ(to.Contains(name->GetName()), i + 1) << i;
+        }
+        EXPECT_EQ(Values(to.GetPropertyName(5)->GetPossibleValues()),
+                  (std::vector<std::string>{"A", "B", "C"}));
+        EXPECT_EQ(api.ClearList(), 1);
+        if (early) {
+            early->First();
+            EXPECT_TRUE(early->IsEnd());
+            ASSERT_EQ(api.AddName("Again", VnI::INT_TYPE, true), 0);
+            early->First();
+            ASSERT_FALSE(early->IsEnd());
+            EXPECT_EQ(early->CurrentItem()->GetName(), Port::StringBase<char>("Again"));
+        }
+    }
+}

@@ -1,4 +1,5 @@
 // What the holder's hot paths cost in allocations.
+#include "s/GenericPropertyHolder.h"
 #include "s/PropertyFactory.h"
 #include "s/PropertyHolder.h"
 #include "s/PropertyNameList.h"
@@ -7,7 +8,9 @@
 
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <string>
+#include <vector>
 
 using CommonI::RefCountPtr;
 using Port::StringBase;
@@ -91,4 +94,34 @@ TEST(HolderAllocations, SlotsAreReservedForTwiceTheNamesAndAtLeastSixteen) {
     EXPECT_EQ(VnTest::AllocationsOf([&] { many.AddProperty(NameOf(79), p); }), 0);
     schema.AddName(NameOf(80), VnI::INT_TYPE, true);
     EXPECT_EQ(VnTest::AllocationsOf([&] { many.AddProperty(NameOf(80), p); }), 1);
+}
+
+// A generic holder carries a name list of its own: sixteen properties must not cost a
+// name object (and its record) per property, only a few growing blocks for the whole list.
+TEST(Allocation, GenericHolderListsItsNamesInAFewBlocks) {
+    std::vector<Port::StringBase<char>> names;
+    std::vector<CommonI::RefCountPtr<VnI::IProperty>> properties;
+    for (int i = 0; i < 16; ++i) {
+        names.emplace_back(("Prop" + std::to_string(i)).c_str());
+        properties.push_back(CommonI::RefCountPtr<VnI::IProperty>::Adopt(
+            Vn::Eng::PropertyFactory::CreateIntProperty(i, true)));
+    }
+    std::unique_ptr<Vn::Eng::GenericPropertyHolder> holder;
+    const long allocations = VnTest::AllocationsOf([&] {
+        holder = std::make_unique<Vn::Eng::GenericPropertyHolder>();
+        for (int i = 0; i < 16; ++i) {
+            ASSERT_EQ(holder->AddProperty(names[static_cast<std::size_t>(i)],
+                                          properties[static_cast<std::size_t>(i)]),
+                      1);
+        }
+    });
+    // The holder and its records, the slots, and the list's entries and texts growing
+    // by doubling.
+    EXPECT_LE(allocations, 12);
+    for (int i = 0; i < 16; ++i) {
+        EXPECT_EQ(holder->GetPropertyByName(names[static_cast<std::size_t>(i)]),
+                  properties[static_cast<std::size_t>(i)]);
+        EXPECT_EQ(properties[static_cast<std::size_t>(i)]->GetIndex(), i);
+    }
+    EXPECT_EQ(holder->GetPropertyByName("Prop16"), nullptr);
 }
