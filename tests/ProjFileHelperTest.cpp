@@ -397,6 +397,10 @@ TEST_F(ProjectLookup, RefusesEveryKindOfMalformedLineNamingIt) {
         {"view a X\nunit a T d f no-such\n", "line 2: unknown unit option 'no-such'"},
         {"fail everything\n", "line 1: unknown step 'everything'"},
         {"counting twice\n", "line 1: counting takes prjrep or common"},
+        {"fail\n", "line 1: fail takes one step name"},
+        {"default\n", "line 1: default takes one view name"},
+        {"view a X\ndefault a\ndefault a\n", "line 3: a second default line"},
+        {"binding\n", "line 1: binding takes a view"},
         {"view a X\nbinding a b c\nview b X\n", "line 2: no view named 'c'"},
     };
     for (const auto& [text, reason] : cases) {
