@@ -73,12 +73,14 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
     thread_local LastExpression last;
     const int shape = flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
     if (!last.compiled || last.flags != shape || last.pattern != pattern.view()) {
-        // Case is ignored by the expression itself: upper-casing the pattern would turn
-        // escapes such as \d, \w and \s into their negations. With the expression
-        // ignoring case, upper-casing the value as well would change no outcome.
-        const std::string flagsPart = (shape & VnI::MATCH_IGNORE_CASE) != 0 ? "(?i)" : "";
+        // Case is ignored by the expression itself (ASCII letters, as everywhere else):
+        // upper-casing the pattern would turn escapes such as \d, \w and \s into their
+        // negations. With the expression ignoring case, upper-casing the value as well
+        // would change no outcome.
+        const auto letterCase = (shape & VnI::MATCH_IGNORE_CASE) != 0 ? Port_Regexp::Case::Ignore
+                                                                      : Port_Regexp::Case::Match;
         std::string body;
-        body.reserve(pattern.GetLength() + 4);
+        body.reserve(pattern.GetLength() + 5);
         if ((shape & VnI::MATCH_SUBSTRING) != 0) {
             body += ".*";
         }
@@ -86,14 +88,14 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
         if ((shape & VnI::MATCH_SUBSTRING) != 0) {
             body += ".*";
         }
-        last.compiled.emplace(std::string_view(flagsPart + body));
+        last.compiled.emplace(std::string_view(body), letterCase);
         if (last.compiled->IsValid()) {
             // The match is anchored at the start anyway, so a leading ^ changes no
             // outcome; but it lets the engine test a pattern's literal prefix with one
             // compare before running its automaton, which rejects most values of a
             // search at a fraction of the cost. Whether the pattern is valid is still
             // decided without it: ^ makes some invalid patterns ("(?)?x") valid.
-            Port_Regexp anchored(std::string_view(flagsPart + "^" + body));
+            Port_Regexp anchored(std::string_view("^" + body), letterCase);
             if (anchored.IsValid()) {
                 last.compiled.emplace(std::move(anchored));
             }

@@ -215,41 +215,40 @@ void Move(TreeNode* parent, TreeNode* node, TreeNode* before) {
 
 // --- Destruction without recursion -------------------------------------------------
 
-// Chains whose first node's reference a dying node handed over. A node that dies while
-// they are taken apart adds its own children here instead of releasing them itself, so
-// the stack stays flat however deep or wide the tree.
-struct Graveyard {
-    std::vector<TreeNode*> chains;
-    bool draining = false;
-};
-
-Graveyard& ThreadGraveyard() {
-    static thread_local Graveyard graveyard;
-    return graveyard;
-}
+// Chains whose first node's reference a dying node handed over wait on a list threaded
+// through those first nodes' m_prevSibling (a first child has no previous sibling), so
+// burying allocates nothing. A node that dies while they are taken apart adds its own
+// children here instead of releasing them itself, so the stack stays flat however deep
+// or wide the tree.
+//
+// The per-thread state is two trivially destructible words, constant-initialised: a node
+// may die at any moment, during static destruction or thread exit included, and such
+// state is never torn down before it, whatever was destroyed first.
+constinit thread_local TreeNode* t_buried = nullptr;
+constinit thread_local bool t_draining = false;
 
 void Bury(TreeNode* chain) {
-    Graveyard& g = ThreadGraveyard();
-    g.chains.push_back(chain);
-    if (g.draining) {
-        return;
+    R(chain).m_prevSibling = t_buried;
+    t_buried = chain;
+    if (t_draining) {
+        return; // the outermost teardown on this thread takes it apart
     }
-    g.draining = true;
-    while (!g.chains.empty()) {
-        TreeNode* node = g.chains.back();
-        g.chains.pop_back();
+    t_draining = true;
+    while (t_buried != nullptr) {
+        TreeNode* node = t_buried;
         Record& r = R(node);
+        t_buried = r.m_prevSibling;
+        r.m_prevSibling = nullptr;
         // Detach node alone; the rest of its chain (with the reference node held on it)
         // waits its turn. Survivors end up as single nodes, out of every chain.
         if (TreeNode* rest = std::exchange(r.m_nextSibling, nullptr)) {
-            R(rest).m_prevSibling = nullptr;
-            g.chains.push_back(rest);
+            R(rest).m_prevSibling = t_buried;
+            t_buried = rest;
         }
-        r.m_prevSibling = nullptr;
         r.m_linkedUnder = nullptr;
         Release(node);
     }
-    g.draining = false;
+    t_draining = false;
 }
 
 // --- Deep copy ---------------------------------------------------------------------

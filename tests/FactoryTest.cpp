@@ -5,6 +5,11 @@
 
 #include <dlfcn.h>
 
+#include <atomic>
+#include <string>
+#include <thread>
+#include <vector>
+
 namespace {
 constexpr Port::XUID kTestClassId{0x1111222233334444ull, 0x5555666677778888ull};
 
@@ -64,4 +69,72 @@ TEST(ComponentFactory, FindsComponentsThroughTheSearchPathVariable) {
     ::setenv("VENLOMER_COMPONENT_PATH", ("/nonexistent:" + dir).c_str(), 1);
     EXPECT_TRUE(CitP::Factory::LoadLibraryFactory("libvenlomer_test_component.so"));
     ::unsetenv("VENLOMER_COMPONENT_PATH");
+}
+
+namespace {
+constexpr Port::XUID kSlowClassId{0x5105105105105105ull, 0x0123456789abcdefull};
+constexpr Port::XUID kFlakyClassId{0xf1a4f1a4f1a4f1a4ull, 0x0123456789abcdefull};
+
+int InitsOf(const char* component) {
+    const std::string path = CitP::Factory::LoadedPath(component);
+    void* handle = ::dlopen(path.c_str(), RTLD_NOW | RTLD_NOLOAD);
+    EXPECT_NE(handle, nullptr) << component;
+    auto inits = reinterpret_cast<int (*)()>(::dlsym(handle, "SlowComponent_Inits"));
+    const int n = inits != nullptr ? inits() : -1;
+    ::dlclose(handle);
+    return n;
+}
+} // namespace
+
+TEST(ComponentFactory, ConcurrentLoadsOfOneNameWaitForItsInit) {
+    // The init takes a while: every thread asks while it runs, and none may be told
+    // "loaded" before the component's classes are there to create.
+    constexpr int kThreads = 8;
+    std::atomic<int> ready{0};
+    std::atomic<int> loaded{0};
+    std::atomic<int> created{0};
+    std::vector<std::thread> threads;
+    for (int i = 0; i < kThreads; ++i) {
+        threads.emplace_back([&] {
+            ++ready;
+            while (ready.load() < kThreads) {
+                std::this_thread::yield();
+            }
+            if (CitP::Factory::LoadLibraryFactory("venlomer_test_slow_component")) {
+                ++loaded;
+                if (CitP::Factory::CreateInstanceRef(kSlowClassId)) {
+                    ++created;
+                }
+            }
+        });
+    }
+    for (auto& t : threads) {
+        t.join();
+    }
+    EXPECT_EQ(loaded.load(), kThreads);
+    EXPECT_EQ(created.load(), kThreads) << "a load answered true before the init registered";
+    EXPECT_EQ(InitsOf("venlomer_test_slow_component"), 1) << "the init runs once";
+}
+
+TEST(ComponentFactory, AFailedInitLeavesTheNameUnloadedAndALaterLoadRetries) {
+    constexpr const char* kName = "venlomer_test_flaky_component";
+    EXPECT_FALSE(CitP::Factory::LoadLibraryFactory(kName)) << "the first init throws";
+    EXPECT_TRUE(CitP::Factory::LoadedPath(kName).empty());
+    EXPECT_EQ(CitP::Factory::CreateInstance(kFlakyClassId), nullptr);
+
+    // Two threads ask again: one runs the second init, the other waits for it; both
+    // find the class registered.
+    std::atomic<int> created{0};
+    auto load = [&] {
+        if (CitP::Factory::LoadLibraryFactory(kName) &&
+            CitP::Factory::CreateInstanceRef(kFlakyClassId)) {
+            ++created;
+        }
+    };
+    std::thread other(load);
+    load();
+    other.join();
+    EXPECT_EQ(created.load(), 2);
+    EXPECT_FALSE(CitP::Factory::LoadedPath(kName).empty());
+    EXPECT_EQ(InitsOf(kName), 2) << "a loaded component is not initialised again";
 }

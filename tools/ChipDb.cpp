@@ -16,7 +16,7 @@ namespace {
 // from making the drawing or the tile index absurdly large.
 constexpr int kMaxGridSide = 1024;
 
-enum class Section { None, Device, Tile, WantedPins, Skipped };
+enum class Section { None, Device, Tile, WantedPins, GlobalBufferPins, Skipped };
 
 std::vector<std::string_view> Fields(std::string_view line) {
     std::vector<std::string_view> fields;
@@ -85,6 +85,8 @@ public:
         switch (m_section) {
         case Section::WantedPins:
             return PinLine(fields);
+        case Section::GlobalBufferPins:
+            return GlobalBufferPinLine(fields);
         case Section::None:
             return Fail("text outside any section");
         default:
@@ -158,6 +160,10 @@ private:
         }
         if (name == ".pins") {
             return PinsHeader(fields);
+        }
+        if (name == ".gbufpin") {
+            m_section = Section::GlobalBufferPins;
+            return true;
         }
         m_section = Section::Skipped;
         return true;
@@ -249,6 +255,19 @@ private:
         return true;
     }
 
+    bool GlobalBufferPinLine(const std::vector<std::string_view>& f) {
+        GlobalBufferPin pin;
+        if (f.size() != 4 || !ToInt(f[0], pin.x) || !ToInt(f[1], pin.y) || !ToInt(f[2], pin.pio) ||
+            !ToInt(f[3], pin.network)) {
+            return Fail("a .gbufpin line wants two coordinates, an IO block and a network number");
+        }
+        if (!m_seenDevice || !InGrid(pin.x, pin.y) || pin.pio < 0 || pin.network < 0) {
+            return Fail("global buffer pin outside the device");
+        }
+        m_db.globalBufferPins.push_back(pin);
+        return true;
+    }
+
     std::string_view m_source;
     std::string_view m_wanted;
     ChipDb& m_db;
@@ -275,6 +294,15 @@ const char* TileKindName(TileKind kind) {
         return "ramt";
     }
     return "?";
+}
+
+bool IsGlobalBufferPin(const ChipDb& db, const Pin& pin) {
+    for (const GlobalBufferPin& g : db.globalBufferPins) {
+        if (g.x == pin.x && g.y == pin.y && g.pio == pin.pio) {
+            return true;
+        }
+    }
+    return false;
 }
 
 int IoBankOf(int x, int y, int width, int height) {

@@ -46,19 +46,32 @@ struct Pin {
     std::size_t line = 0;
 };
 
+/// An IO block that drives a global network directly when used as an input (the
+/// .gbufpin section); clocks belong on these.
+struct GlobalBufferPin {
+    int x = 0;
+    int y = 0;
+    int pio = 0;
+    int network = 0; ///< the global network it drives
+};
+
 struct ChipDb {
     std::string device; ///< the device name of the .device line, such as "8k"
     int width = 0;
     int height = 0;
-    std::string package;               ///< the package whose pins were read
-    std::vector<std::string> packages; ///< every package of the file, in file order
-    std::vector<Tile> tiles;           ///< in file order
-    std::vector<Pin> pins;             ///< in file order
+    std::string package;                           ///< the package whose pins were read
+    std::vector<std::string> packages;             ///< every package of the file, in file order
+    std::vector<Tile> tiles;                       ///< in file order
+    std::vector<Pin> pins;                         ///< in file order
+    std::vector<GlobalBufferPin> globalBufferPins; ///< in file order, of every package
 };
 
 /// The IO bank of a tile on the edge of a width x height grid, numbered as this family's
 /// data sheets do: top edge 0, right 1, bottom 2, left 3; -1 for a tile inside.
 int IoBankOf(int x, int y, int width, int height);
+
+/// Whether `pin` is bonded to an IO block of the .gbufpin section.
+bool IsGlobalBufferPin(const ChipDb& db, const Pin& pin);
 
 /// Reads a chip database from a stream. `package` names the package whose pins are kept;
 /// empty takes the first package of the file. `source` names the input in messages.

@@ -11,6 +11,7 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
+#include <set>
 #include <sstream>
 
 namespace {
@@ -152,6 +153,42 @@ TEST(ChipDbReader, AnUnknownPackageIsRefusedWithTheNamesThereAre) {
     EXPECT_NE(error.find("a, b:x"), std::string::npos) << error;
 }
 
+// The global-buffer pins as this family's data sheets list them for two packages, read
+// here from the installed databases: a misread .gbufpin line moves one of them.
+TEST(ChipDbReader, GlobalBufferPinsAreThePackagePinsOfTheDataSheets) {
+    struct Case {
+        const char* file;
+        const char* package;
+        std::set<std::string> pins;
+    };
+    const Case cases[] = {
+        {"chipdb-1k.txt", "tq144", {"20", "21", "49", "50", "93", "94", "128", "129"}},
+        {"chipdb-8k.txt", "ct256", {"C8", "F7", "G1", "H11", "H16", "J3", "K9", "R9"}},
+    };
+    for (const Case& c : cases) {
+        std::string path = std::string(VENLOMER_SYSTEM_CHIPDB_DIR) + "/" + c.file;
+        if (!std::filesystem::exists(path)) {
+            GTEST_SKIP() << path << " is not installed (package fpga-icestorm-chipdb)";
+        }
+        ChipDb db;
+        std::string error;
+        ASSERT_TRUE(VnTool::ReadChipDbFile(path, c.package, db, error)) << error;
+        EXPECT_EQ(db.globalBufferPins.size(), 8u);
+        std::set<std::string> found;
+        std::set<int> networks;
+        for (const auto& pin : db.pins) {
+            if (VnTool::IsGlobalBufferPin(db, pin)) {
+                found.insert(pin.name);
+            }
+        }
+        for (const auto& g : db.globalBufferPins) {
+            networks.insert(g.network);
+        }
+        EXPECT_EQ(found, c.pins) << c.file;
+        EXPECT_EQ(networks, (std::set<int>{0, 1, 2, 3, 4, 5, 6, 7})) << c.file;
+    }
+}
+
 struct Malformed {
     const char* text;
     const char* where; // expected prefix "test.txt:N:" or the whole-file reason
@@ -184,6 +221,8 @@ TEST(ChipDbReader, MalformedInputIsRefusedWithTheLine) {
         {".device a 4 4 0\n.pins p\n\nA1 1 1 0\n.logic_tile 1 1\n", "test.txt:4:", "no IO tile"},
         {".device a 4 4 0\n.pins p\nA1 0 2 0\n", "test.txt:3:", "no IO tile"},
         {".device a 4 4 0\n.pins p\nA1 1 2 0\n.io_tile 1 2\n", "test.txt:3:", "on no edge"},
+        {".device a 4 4 0\n.gbufpin\n0 1 0\n", "test.txt:3:", ".gbufpin line wants"},
+        {".device a 4 4 0\n.gbufpin\n0 9 0 1\n", "test.txt:3:", "outside the device"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.text);

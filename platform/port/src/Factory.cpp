@@ -5,6 +5,7 @@
 #include "Port/File.h"
 #include "Port/StringBase.h"
 
+#include <cxxabi.h>
 #include <dlfcn.h>
 
 #include <cstdlib>
@@ -55,20 +56,9 @@ std::vector<std::string> Candidates(const std::string& name) {
     return paths;
 }
 
-} // namespace
-
-bool Factory::LoadLibraryFactory(const Port::StringBase<char>& name) {
-    const std::string key = name.str();
-    if (key.empty() || key.find('\0') != std::string::npos) {
-        return false;
-    }
-    auto& libraries = Port::detail::Libraries();
-    {
-        std::lock_guard<std::mutex> lock(libraries.mutex);
-        if (libraries.loaded.count(key) != 0) {
-            return true;
-        }
-    }
+// Opens the component and runs its init. The path it was loaded from, or empty when no
+// candidate loaded or the init failed (threw).
+std::string OpenAndInit(const std::string& key) {
     for (const std::string& path : Candidates(key)) {
         if (!Port::File::exist(path.c_str())) {
             continue;
@@ -77,20 +67,72 @@ bool Factory::LoadLibraryFactory(const Port::StringBase<char>& name) {
         if (handle == nullptr) {
             continue;
         }
-        {
-            std::lock_guard<std::mutex> lock(libraries.mutex);
-            if (!libraries.loaded.emplace(key, path).second) {
-                return true; // another thread loaded it meanwhile; its init already ran
+        // Components stay loaded for the life of the process: objects they made, or
+        // creators a failing init registered before it gave up, may be alive anywhere,
+        // so the handle is never closed.
+        if (auto init = reinterpret_cast<void (*)()>(::dlsym(handle, "CitP_ComponentInit"))) {
+            try {
+                init();
+            } catch (abi::__forced_unwind&) {
+                throw; // a cancelled thread must go on unwinding
+            } catch (...) {
+                return {}; // an init that throws has failed
             }
         }
-        // Components stay loaded for the life of the process: objects they made may be
-        // alive anywhere, so the handle is never closed.
-        if (auto init = reinterpret_cast<void (*)()>(::dlsym(handle, "CitP_ComponentInit"))) {
-            init();
-        }
-        return true;
+        return path;
     }
-    return false;
+    return {};
+}
+
+} // namespace
+
+bool Factory::LoadLibraryFactory(const Port::StringBase<char>& name) {
+    const std::string key = name.str();
+    if (key.empty() || key.find('\0') != std::string::npos) {
+        return false;
+    }
+    auto& libraries = Port::detail::Libraries();
+    std::unique_lock<std::mutex> lock(libraries.mutex);
+    // A name counts as loaded only once its init has registered its classes: until then,
+    // other loaders of the name wait for the one that runs it.
+    for (;;) {
+        if (libraries.loaded.count(key) != 0) {
+            return true;
+        }
+        const auto running = libraries.loading.find(key);
+        if (running == libraries.loading.end()) {
+            break;
+        }
+        if (running->second == std::this_thread::get_id()) {
+            return true; // the component's own init asks for itself: it is loaded
+        }
+        libraries.settled.wait(lock);
+    }
+    libraries.loading.emplace(key, std::this_thread::get_id());
+    lock.unlock();
+
+    // Whatever way this call ends, the name stops loading and its waiters wake: loaded
+    // when the init succeeded, unloaded otherwise (a later call may try again).
+    std::string path;
+    struct Settle {
+        Port::detail::LibraryTable& libraries;
+        const std::string& key;
+        std::string& path;
+        ~Settle() {
+            {
+                std::lock_guard<std::mutex> relock(libraries.mutex);
+                libraries.loading.erase(key);
+                if (!path.empty()) {
+                    libraries.loaded.emplace(key, path);
+                }
+            }
+            libraries.settled.notify_all();
+        }
+    } settle{libraries, key, path};
+    // The init runs without the lock: it registers its classes through the factory, and
+    // may load other components.
+    path = OpenAndInit(key);
+    return !path.empty();
 }
 
 std::string Factory::LoadedPath(const Port::StringBase<char>& name) {

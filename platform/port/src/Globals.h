@@ -5,9 +5,11 @@
 #include "Port/MsgMan.h"
 #include "Port/XUID.h"
 
+#include <condition_variable>
 #include <map>
 #include <mutex>
 #include <string>
+#include <thread>
 #include <unordered_map>
 
 namespace Port::detail {
@@ -26,6 +28,10 @@ struct ClassTable {
 struct LibraryTable {
     std::mutex mutex;
     std::map<std::string, std::string> loaded; // name asked for -> path loaded
+    // Names whose component is being loaded and initialised, with the thread doing it.
+    // Other loaders of such a name wait on `settled` until it is loaded or has failed.
+    std::map<std::string, std::thread::id> loading;
+    std::condition_variable settled;
 };
 
 struct MessageState {

@@ -10,8 +10,10 @@
 //
 //   extern "C" void CitP_ComponentInit();   // calls CitP::Factory::RegisterClass(...)
 //
-// which the loader calls once, right after the library is loaded. Libraries stay loaded
-// for the life of the process.
+// which the loader calls once, right after the library is loaded. A name counts as
+// loaded only once that init has returned: other threads loading the same name meanwhile
+// wait for it. An init that throws has failed: the name stays unloaded and a later load
+// tries again. Libraries stay loaded for the life of the process.
 //
 //===------------------------------------------------------------------------------===//
 #pragma once

@@ -1,0 +1,277 @@
+//===-- tests/design/PinPlanTest.cpp - checks, automatic assignment, holders -----===//
+#include "PinPlan.h"
+#include "PortHolders.h"
+
+#include "CommonI/RefCountPtr.h"
+#include "VnI/PropertyType.h"
+#include "s/FindItr.h"
+#include "s/PropertyFactory.h"
+#include "s/PropertyHolderItr.h"
+#include "s/SelectionManager.h"
+#include "s/TreeNode.h"
+
+#include <gtest/gtest.h>
+
+#include <map>
+#include <sstream>
+
+namespace {
+
+using VnTool::ChipDb;
+using VnTool::Design;
+using VnTool::PcfFile;
+using VnTool::PinProblem;
+
+// A 6 x 6 device: pins 1-3 on the top edge (bank 0), 4-6 right (1), 7-8 bottom (2),
+// 9-10 left (3); pins 8 and 10 drive global buffers.
+const char kDevice[] = ".device t 6 6 0\n"
+                       ".pins p\n"
+                       "1 1 5 0\n2 2 5 0\n3 3 5 0\n4 5 2 0\n5 5 3 0\n6 5 3 1\n"
+                       "7 2 0 0\n8 3 0 1\n9 0 2 0\n10 0 3 1\n"
+                       ".gbufpin\n3 0 1 0\n0 3 1 1\n"
+                       ".io_tile 1 5\n.io_tile 2 5\n.io_tile 3 5\n.io_tile 5 2\n.io_tile 5 3\n"
+                       ".io_tile 2 0\n.io_tile 3 0\n.io_tile 0 2\n.io_tile 0 3\n";
+
+ChipDb Device() {
+    ChipDb db;
+    std::istringstream in(kDevice);
+    std::string error;
+    EXPECT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
+    return db;
+}
+
+VnTool::DesignPort Port(std::string bus, int bit, int width, bool clock = false) {
+    VnTool::DesignPort port;
+    port.bus = bus;
+    port.bit = bit;
+    port.width = width;
+    port.clock = clock;
+    port.name = bit < 0 ? bus : bus + "[" + std::to_string(bit) + "]";
+    return port;
+}
+
+// clk, rst, led[0..2] (listed high bit first, as a [0:2] bus is), d[0..1].
+Design Counter() {
+    Design design;
+    design.top = "top";
+    design.ports = {Port("clk", -1, 1, true), Port("led", 2, 3),  Port("led", 1, 3),
+                    Port("led", 0, 3),        Port("rst", -1, 1), Port("d", 0, 2),
+                    Port("d", 1, 2)};
+    return design;
+}
+
+PcfFile Pcf(const std::string& text) {
+    PcfFile pcf;
+    std::string error;
+    EXPECT_TRUE(pcf.Parse(text, "p.pcf", error)) << error;
+    return pcf;
+}
+
+std::vector<std::string> Messages(const std::vector<PinProblem>& problems) {
+    std::vector<std::string> messages;
+    for (const auto& problem : problems) {
+        messages.push_back(problem.message);
+    }
+    return messages;
+}
+
+TEST(PinChecks, EachMistakeIsReportedAtItsLine) {
+    ChipDb db = Device();
+    Design design = Counter();
+    PcfFile pcf = Pcf("# plan\n"
+                      "set_io clk 8\n"
+                      "set_io rst 99\n" // no such pin
+                      "set_io led[0] 1\n"
+                      "set_io led[1] 1\n" // pin taken
+                      "set_io led[2] 2\n"
+                      "set_io led[2] 3\n"        // second pin for a port
+                      "set_io led[0] 1\n"        // the same line again
+                      "set_io ghost 4\n"         // not in the design
+                      "set_io -nowarn spare 5\n" // not in the design, but said so
+                      "set_io d[0] 6\n"
+                      "set_foo x\n");
+    auto problems = VnTool::CheckPins(db, design, "top.json", pcf, false);
+    EXPECT_EQ(
+        Messages(problems),
+        (std::vector<std::string>{
+            "p.pcf:3: error: pin '99' is not in package p of device t",
+            "p.pcf:5: error: pin 1 already holds port 'led[0]' (line 4)",
+            "p.pcf:7: error: port 'led[2]' is put on two pins: 2 (line 6) and 3",
+            "p.pcf:8: error: duplicate constraint: port 'led[0]' is already on pin 1 (line 4)",
+            "p.pcf:9: error: design top.json has no port 'ghost' (add -nowarn to keep the line "
+            "anyway)",
+            "p.pcf:12: error: nextpnr-ice40 knows no PCF command 'set_foo'",
+            "top.json: warning: port 'd[1]' has no pin",
+        }));
+    EXPECT_TRUE(VnTool::HasErrors(problems));
+    EXPECT_EQ(problems[1].port, "led[1]");
+    EXPECT_EQ(problems[1].pin, "1");
+}
+
+TEST(PinChecks, APortWithoutPinIsAnErrorOnlyWhenStrict) {
+    ChipDb db = Device();
+    Design design = Counter();
+    PcfFile pcf = Pcf("set_io clk 8\nset_io rst 7\nset_io led[0] 1\nset_io led[1] 2\n"
+                      "set_io led[2] 3\nset_io d[0] 4\nset_frequency clk 12\n");
+    auto lax = VnTool::CheckPins(db, design, "top.json", pcf, false);
+    EXPECT_EQ(Messages(lax), std::vector<std::string>{"top.json: warning: port 'd[1]' has no pin"});
+    EXPECT_FALSE(VnTool::HasErrors(lax));
+    auto strict = VnTool::CheckPins(db, design, "top.json", pcf, true);
+    EXPECT_EQ(Messages(strict),
+              std::vector<std::string>{"top.json: error: port 'd[1]' has no pin"});
+
+    pcf.Assign("d[1]", "5");
+    EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, true).empty());
+}
+
+TEST(PinChecks, AClockOffTheGlobalBufferPinsIsAWarningNamingThem) {
+    ChipDb db = Device();
+    Design design;
+    design.ports = {Port("clk", -1, 1, true), Port("data", -1, 1)};
+    PcfFile pcf = Pcf("set_io clk 1\nset_io data 10\n");
+    EXPECT_EQ(Messages(VnTool::CheckPins(db, design, "top.json", pcf, true)),
+              std::vector<std::string>{"p.pcf:1: warning: clock port 'clk' is on pin 1, which "
+                                       "drives no global buffer (those are 8, 10)"});
+}
+
+TEST(PinChecks, PinsAreCountedAsPeopleCountThem) {
+    ChipDb db;
+    std::istringstream in(".device t 4 4 0\n.pins p\nB1 0 1 0\nA10 0 2 0\nA2 0 1 1\n10 0 2 1\n"
+                          "9 3 1 0\nA02 3 1 1\n.io_tile 0 1\n.io_tile 0 2\n.io_tile 3 1\n");
+    std::string error;
+    ASSERT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
+    std::vector<std::string> names;
+    for (const auto* pin : VnTool::PinsInOrder(db)) {
+        names.push_back(pin->name);
+    }
+    EXPECT_EQ(names, (std::vector<std::string>{"9", "10", "A02", "A2", "A10", "B1"}));
+}
+
+TEST(AutoAssign, ClocksTakeGlobalBuffersAndBusesStayTogetherInOneBank) {
+    ChipDb db = Device();
+    Design design = Counter();
+    PcfFile pcf = Pcf("# mine\n");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    std::map<std::string, std::string> pins(given.begin(), given.end());
+    EXPECT_EQ(pins, (std::map<std::string, std::string>{{"clk", "8"},
+                                                        {"led[0]", "1"},
+                                                        {"led[1]", "2"},
+                                                        {"led[2]", "3"},
+                                                        {"d[0]", "4"},
+                                                        {"d[1]", "5"},
+                                                        {"rst", "6"}}));
+    EXPECT_EQ(pcf.Text().rfind("# mine\n", 0), 0u);
+    EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, true).empty());
+
+    // The same plan again from the same start: nothing depends on chance or addresses.
+    PcfFile again = Pcf("# mine\n");
+    VnTool::AutoAssign(db, design, again);
+    EXPECT_EQ(again.Text(), pcf.Text());
+}
+
+TEST(AutoAssign, KeepsTheUsersPinsAndFillsAroundThem) {
+    ChipDb db = Device();
+    Design design = Counter();
+    // led[1] sits in bank 0 already and pin 4 is taken by a line for another design's
+    // port: the rest of led still fits in bank 0; d moves to bank 1's remaining pins.
+    PcfFile pcf = Pcf("set_io led[1] 2\nset_io -nowarn other 4\n");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    std::map<std::string, std::string> pins(given.begin(), given.end());
+    EXPECT_EQ(pins, (std::map<std::string, std::string>{{"clk", "8"},
+                                                        {"led[0]", "1"},
+                                                        {"led[2]", "3"},
+                                                        {"d[0]", "5"},
+                                                        {"d[1]", "6"},
+                                                        {"rst", "7"}}));
+    EXPECT_EQ(pcf.Text().rfind("set_io led[1] 2\nset_io -nowarn other 4\n", 0), 0u);
+}
+
+TEST(AutoAssign, ABusNoBankCanHoldIsSpreadAndSpareClocksTakeOrdinaryPins) {
+    ChipDb db = Device();
+    Design design;
+    // Three clocks for two global-buffer pins; a four-bit bus no bank holds.
+    design.ports = {Port("c", 0, 3, true), Port("c", 1, 3, true), Port("c", 2, 3, true),
+                    Port("w", 0, 4),       Port("w", 1, 4),       Port("w", 2, 4),
+                    Port("w", 3, 4)};
+    PcfFile pcf = Pcf("");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    EXPECT_EQ(given, (std::vector<std::pair<std::string, std::string>>{{"c[0]", "8"},
+                                                                       {"c[1]", "10"},
+                                                                       {"c[2]", "1"},
+                                                                       {"w[0]", "2"},
+                                                                       {"w[1]", "3"},
+                                                                       {"w[2]", "4"},
+                                                                       {"w[3]", "5"}}));
+
+    // More ports than pins: the ones left over get none and stay unconstrained.
+    for (int i = 0; i < 6; ++i) {
+        design.ports.push_back(Port("x" + std::to_string(i), -1, 1));
+    }
+    PcfFile full = Pcf("");
+    EXPECT_EQ(VnTool::AutoAssign(db, design, full).size(), 10u);
+    auto problems = VnTool::CheckPins(db, design, "top.json", full, false);
+    EXPECT_EQ(problems.size(), 3u + 1u); // x3..x5 without pins, c[2] off a global buffer
+}
+
+using Text = Port::StringBase<char>;
+template <class T> using Ptr = CommonI::RefCountPtr<T>;
+
+std::vector<std::string> Found(VnTool::PortHolders& ports, const char* name, VnI::IProperty* wanted,
+                               int flags) {
+    auto all = ports.List();
+    auto found =
+        Vn::Eng::FindItr::CreateInstance(Vn::Eng::PropertyHolderItr::CreateInstance(&all), name,
+                                         Ptr<const VnI::IProperty>::Adopt(wanted), flags);
+    std::vector<std::string> names;
+    for (; !found->IsEnd(); found->Next()) {
+        names.push_back(found->CurrentItem()->GetName().str());
+    }
+    return names;
+}
+
+TEST(PortHolders, PortsAreSearchedSelectedAndShownAsPinsAre) {
+    ChipDb db = Device();
+    Design design = Counter();
+    design.ports[4].direction = VnTool::PortDirection::Inout;
+    VnTool::PortHolders ports(design);
+    PcfFile pcf = Pcf("set_io clk 8\nset_io led[0] 1\nset_io led[1] 2\nset_io d[0] 99\n");
+    ports.ApplyPins(db, pcf);
+
+    ASSERT_EQ(ports.Size(), design.ports.size());
+    auto* clk = ports.Find("clk");
+    ASSERT_NE(clk, nullptr);
+    EXPECT_EQ(clk->GetType(), VnTool::kPortHolderType);
+    EXPECT_NE(clk->GetType(), 7);
+    EXPECT_EQ(clk->GetPropertyNames(), ports.Find("rst")->GetPropertyNames());
+    EXPECT_EQ(clk->GetPropertyByName("Pin")->GetStringProperty().str(), "8");
+    EXPECT_EQ(clk->GetPropertyByName("Bank")->GetIntProperty(), 2);
+    EXPECT_EQ(ports.Find("d[0]")->GetPropertyByName("Pin")->GetStringProperty().str(), "99");
+    EXPECT_EQ(ports.Find("d[0]")->GetPropertyByName("Bank")->GetIntProperty(), -1);
+    EXPECT_EQ(ports.Find("led[2]")->GetPropertyByName("Pin")->GetStringProperty().str(), "");
+
+    using Vn::Eng::PropertyFactory;
+    EXPECT_EQ(
+        Found(ports, "Clock", PropertyFactory::CreateBoolProperty(true, true), VnI::MATCH_EXACT),
+        std::vector<std::string>{"clk"});
+    EXPECT_EQ(Found(ports, "Bank", PropertyFactory::CreateIntProperty(0, true), VnI::MATCH_EXACT),
+              (std::vector<std::string>{"led[1]", "led[0]"}));
+    EXPECT_EQ(Found(ports, "Name", PropertyFactory::CreateStringProperty("LED\\[[12]\\]", true),
+                    VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE),
+              (std::vector<std::string>{"led[2]", "led[1]"}));
+    EXPECT_EQ(Found(ports, "Bit", PropertyFactory::CreateIntProperty(1, true), VnI::MATCH_EXACT),
+              (std::vector<std::string>{"led[1]", "d[1]"}));
+    // A direction is searched by its text, as a user types it.
+    EXPECT_EQ(Found(ports, "Direction", PropertyFactory::CreateStringProperty("inout", true),
+                    VnI::MATCH_EXACT),
+              std::vector<std::string>{"rst"});
+
+    Vn::Eng::SelectionManager selection;
+    selection.AddSelectedItem(clk, false);
+    EXPECT_TRUE(clk->IsSelected());
+    auto node = Vn::Eng::TreeNode::CreateInstance(clk, nullptr);
+    EXPECT_EQ(node->GetDataRef(), clk);
+    EXPECT_EQ(node->GetDataRef()->GetName().str(), "clk");
+    selection.RemoveAll();
+}
+
+} // namespace
