@@ -1,6 +1,7 @@
 //===-- Regexp.cpp - RE2 behind Port_Regexp, with a compile cache ---------------===//
 #include "Port/Regexp.h"
 
+#include "Port/LastBuilt.h"
 #include "Port/StringBase.h"
 
 #include <re2/re2.h>
@@ -598,17 +599,9 @@ PatternCache& SharedCache() {
 // In front of the shared cache, the last pattern of this thread: a search compares every
 // holder with the same pattern, so most constructions take no lock at all.
 CompiledPtr Lookup(std::string_view pattern, bool ignoreCase) {
-    thread_local std::string lastPattern;
-    thread_local bool lastIgnoreCase = false;
-    thread_local CompiledPtr lastCompiled;
-    if (lastCompiled && lastIgnoreCase == ignoreCase && lastPattern == pattern) {
-        return lastCompiled;
-    }
-    CompiledPtr compiled = SharedCache().Get(pattern, ignoreCase);
-    lastPattern.assign(pattern);
-    lastIgnoreCase = ignoreCase;
-    lastCompiled = compiled;
-    return compiled;
+    thread_local Port::LastBuilt<CompiledPtr> last;
+    return last.Get(pattern, ignoreCase ? 1 : 0,
+                    [&] { return SharedCache().Get(pattern, ignoreCase); });
 }
 
 } // namespace
