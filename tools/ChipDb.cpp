@@ -1,8 +1,9 @@
 //===-- tools/ChipDb.cpp - reads the tiles and package pins of a chip database --===//
 #include "ChipDb.h"
 
+#include "Port/SafeFile.h"
+
 #include <charconv>
-#include <fstream>
 #include <set>
 #include <unordered_map>
 #include <unordered_set>
@@ -12,9 +13,36 @@ namespace VnTool {
 
 namespace {
 
-// A grid larger than this is no device of the family; refusing it keeps a corrupt size
-// from making the drawing or the tile index absurdly large.
-constexpr int kMaxGridSide = 1024;
+// The family's largest device is 34 x 34 tiles. A grid larger than this is no device of
+// it; refusing it keeps a corrupt size from making the model, which costs about a
+// kilobyte per tile, and the drawing absurdly large.
+constexpr int kMaxGridSide = 128;
+// Every IO tile of the family holds two IO blocks, numbered 0 and 1.
+constexpr int kIoBlocksPerTile = 2;
+// Real files list a handful of packages; many more means a damaged or crafted file.
+constexpr std::size_t kMaxPackages = 64;
+// No line the reader interprets has more fields than this; splitting stops there, so a
+// crafted line of a million words costs nothing.
+constexpr std::size_t kMaxFields = 8;
+
+// Every section name the family's databases use. Anything else is damage: a misspelt
+// tile section would otherwise drop its tile in silence.
+constexpr std::string_view kKnownSections[] = {
+    ".buffer",         ".colbuf",          ".device",
+    ".dsp0_tile",      ".dsp0_tile_bits",  ".dsp1_tile",
+    ".dsp1_tile_bits", ".dsp2_tile",       ".dsp2_tile_bits",
+    ".dsp3_tile",      ".dsp3_tile_bits",  ".extra_bits",
+    ".extra_cell",     ".gbufin",          ".gbufpin",
+    ".ieren",          ".io_tile",         ".io_tile_bits",
+    ".iolatch",        ".ipcon_tile",      ".ipcon_tile_bits",
+    ".logic_tile",     ".logic_tile_bits", ".net",
+    ".pins",           ".ramb_tile",       ".ramb_tile_bits",
+    ".ramt_tile",      ".ramt_tile_bits",  ".routing",
+};
+
+// Tiles the tool does not draw but that fill their place in the grid.
+constexpr std::string_view kOtherTileSections[] = {".dsp0_tile", ".dsp1_tile", ".dsp2_tile",
+                                                   ".dsp3_tile", ".ipcon_tile"};
 
 enum class Section { None, Device, Tile, WantedPins, GlobalBufferPins, Skipped };
 
@@ -31,6 +59,9 @@ std::vector<std::string_view> Fields(std::string_view line) {
         }
         if (i > start) {
             fields.push_back(line.substr(start, i - start));
+            if (fields.size() > kMaxFields) {
+                break;
+            }
         }
     }
     return fields;
@@ -109,26 +140,37 @@ public:
                                            : "; the file has: " + Join(m_db.packages);
             return false;
         }
+        if (m_cutShort) {
+            error = std::string(m_source) + ":" + std::to_string(m_line) +
+                    ": the last line has no line end: the file is cut short";
+            return false;
+        }
+        // Every place of the grid but the four corners holds a tile; fewer means the file
+        // was cut short or damaged, and the picture would quietly miss part of the device.
+        const std::size_t expected = static_cast<std::size_t>(m_db.width) * m_db.height -
+                                     (m_db.width > 1 && m_db.height > 1 ? 4 : 0);
+        if (m_tilesPlaced != expected) {
+            error = std::string(m_source) + ":" + std::to_string(m_line) + ": the file ends with " +
+                    std::to_string(m_tilesPlaced) + " of the " + std::to_string(expected) +
+                    " tiles of a " + std::to_string(m_db.width) + " x " +
+                    std::to_string(m_db.height) + " device: it is cut short or damaged";
+            return false;
+        }
         // Pins come before the tiles in the file, so their tiles are checked at the end.
         for (Pin& pin : m_db.pins) {
-            auto it = m_tileKinds.find(Key(pin.x, pin.y));
-            if (it == m_tileKinds.end() || it->second != TileKind::Io) {
+            if (m_grid[Cell(pin.x, pin.y)] != kIoCell) {
                 error = std::string(m_source) + ":" + std::to_string(pin.line) + ": pin " +
                         pin.name + " lies on " + std::to_string(pin.x) + " " +
                         std::to_string(pin.y) + ", which is no IO tile";
                 return false;
             }
-            pin.bank = IoBankOf(pin.x, pin.y, m_db.width, m_db.height);
-            // Banks are edges; a pin inside the grid would belong to none.
-            if (pin.bank < 0) {
-                error = std::string(m_source) + ":" + std::to_string(pin.line) + ": pin " +
-                        pin.name + " lies on IO tile " + std::to_string(pin.x) + " " +
-                        std::to_string(pin.y) + ", which is on no edge of the device";
-                return false;
-            }
         }
         return true;
     }
+
+    // Called once the stream has ended: a last line without its line end is the mark of
+    // a file cut short in the middle of a line.
+    void CutShort() { m_cutShort = true; }
 
 private:
     static std::string Join(const std::vector<std::string>& names) {
@@ -138,7 +180,15 @@ private:
         }
         return text;
     }
-    static long long Key(int x, int y) { return (static_cast<long long>(x) << 32) | unsigned(y); }
+    // The grid holds, per place, what occupies it: nothing, a tile of a TileKind (stored
+    // plus one), or a tile the tool does not draw.
+    static constexpr unsigned char kEmptyCell = 0;
+    static constexpr unsigned char kIoCell = static_cast<unsigned char>(TileKind::Io) + 1;
+    static constexpr unsigned char kOtherCell = 0xff;
+    std::size_t Cell(int x, int y) const {
+        return static_cast<std::size_t>(y) * static_cast<std::size_t>(m_db.width) +
+               static_cast<std::size_t>(x);
+    }
 
     bool Fail(const std::string& why) {
         if (!m_failed) {
@@ -165,6 +215,49 @@ private:
             m_section = Section::GlobalBufferPins;
             return true;
         }
+        for (std::string_view other : kOtherTileSections) {
+            if (name == other) {
+                return OtherTileLine(fields);
+            }
+        }
+        bool known = false;
+        for (std::string_view section : kKnownSections) {
+            known = known || name == section;
+        }
+        if (!known) {
+            return Fail("unknown section " + std::string(name.substr(0, 64)) +
+                        " (a damaged file?)");
+        }
+        m_section = Section::Skipped;
+        return true;
+    }
+
+    bool Place(std::string_view section, int x, int y, unsigned char what) {
+        if (!InGrid(x, y)) {
+            return Fail(std::string(section) + " outside the device grid");
+        }
+        unsigned char& cell = m_grid[Cell(x, y)];
+        if (cell != kEmptyCell) {
+            return Fail("a second tile at " + std::to_string(x) + " " + std::to_string(y));
+        }
+        cell = what;
+        ++m_tilesPlaced;
+        return true;
+    }
+
+    bool OtherTileLine(const std::vector<std::string_view>& f) {
+        if (!m_seenDevice) {
+            return Fail(std::string(f[0]) + " before the .device line");
+        }
+        int x = 0;
+        int y = 0;
+        if (f.size() != 3 || !ToInt(f[1], x) || !ToInt(f[2], y)) {
+            return Fail(std::string(f[0]) + " wants two coordinates");
+        }
+        if (!Place(f[0], x, y, kOtherCell)) {
+            return false;
+        }
+        // Its bits follow in the lines below, as after the other tile headers.
         m_section = Section::Skipped;
         return true;
     }
@@ -183,6 +276,7 @@ private:
             return Fail("device size out of range");
         }
         m_db.device = std::string(f[1]);
+        m_grid.assign(static_cast<std::size_t>(m_db.width) * m_db.height, kEmptyCell);
         m_seenDevice = true;
         m_section = Section::Device;
         return true;
@@ -201,12 +295,8 @@ private:
         if (f.size() != 3 || !ToInt(f[1], tile.x) || !ToInt(f[2], tile.y)) {
             return Fail(std::string(f[0]) + " wants two coordinates");
         }
-        if (!InGrid(tile.x, tile.y)) {
-            return Fail(std::string(f[0]) + " outside the device grid");
-        }
-        if (!m_tileKinds.emplace(Key(tile.x, tile.y), kind).second) {
-            return Fail("a second tile at " + std::to_string(tile.x) + " " +
-                        std::to_string(tile.y));
+        if (!Place(f[0], tile.x, tile.y, static_cast<unsigned char>(kind) + 1)) {
+            return false;
         }
         m_db.tiles.push_back(tile);
         m_section = Section::Tile;
@@ -222,6 +312,9 @@ private:
             if (seen == package) {
                 return Fail("package " + package + " listed twice");
             }
+        }
+        if (m_db.packages.size() == kMaxPackages) {
+            return Fail("more than " + std::to_string(kMaxPackages) + " packages");
         }
         m_db.packages.push_back(package);
         bool wanted = m_db.package.empty() && (m_wanted.empty() || m_wanted == package);
@@ -246,9 +339,26 @@ private:
         if (pin.pio < 0) {
             return Fail("pin " + std::string(f[0]) + " has a negative IO block number");
         }
+        if (pin.pio >= kIoBlocksPerTile) {
+            return Fail("pin " + std::string(f[0]) + " names IO block " + std::to_string(pin.pio) +
+                        "; an IO tile has blocks 0 and 1");
+        }
+        pin.bank = IoBankOf(pin.x, pin.y, m_db.width, m_db.height);
+        // Banks are edges; a pin inside the grid would belong to none.
+        if (pin.bank < 0) {
+            return Fail("pin " + std::string(f[0]) + " lies on " + std::to_string(pin.x) + " " +
+                        std::to_string(pin.y) + ", which is on no edge of the device");
+        }
         pin.name = std::string(f[0]);
         if (!m_pinNames.insert(pin.name).second) {
             return Fail("pin " + pin.name + " listed twice");
+        }
+        const auto [claimed, fresh] =
+            m_blockOwners.try_emplace(Cell(pin.x, pin.y) * kIoBlocksPerTile + pin.pio, pin.name);
+        if (!fresh) {
+            return Fail("pin " + pin.name + " claims IO block " + std::to_string(pin.pio) +
+                        " of tile " + std::to_string(pin.x) + " " + std::to_string(pin.y) +
+                        ", which pin " + claimed->second + " has");
         }
         pin.line = m_line;
         m_db.pins.push_back(std::move(pin));
@@ -276,8 +386,11 @@ private:
     bool m_seenDevice = false;
     bool m_failed = false;
     std::string m_error;
-    std::unordered_map<long long, TileKind> m_tileKinds;
+    bool m_cutShort = false;
+    std::vector<unsigned char> m_grid; // by Cell(x, y)
+    std::size_t m_tilesPlaced = 0;
     std::unordered_set<std::string> m_pinNames;
+    std::unordered_map<std::size_t, std::string> m_blockOwners; // IO block → pin name
 };
 
 } // namespace
@@ -330,6 +443,9 @@ bool ReadChipDb(std::istream& in, std::string_view source, std::string_view pack
         if (!reader.Line(line)) {
             break;
         }
+        if (in.eof()) {
+            reader.CutShort();
+        }
     }
     if (in.bad()) {
         error = std::string(source) + ": read error";
@@ -340,12 +456,17 @@ bool ReadChipDb(std::istream& in, std::string_view source, std::string_view pack
 
 bool ReadChipDbFile(const std::string& path, std::string_view package, ChipDb& db,
                     std::string& error) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) {
-        error = path + ": cannot open the chip database";
+    Port::InputFile file;
+    if (!file.Open(path, error, Port::kMaxInputBytes, true)) {
         return false;
     }
-    return ReadChipDb(in, path, package, db, error);
+    const std::string source = path == "-" ? "standard input" : path;
+    if (!ReadChipDb(file.Stream(), source, package, db, error)) {
+        // A read cut short at the limit shows up as a truncated file; say which it was.
+        file.Failed(error);
+        return false;
+    }
+    return !file.Failed(error);
 }
 
 } // namespace VnTool

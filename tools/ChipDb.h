@@ -80,7 +80,8 @@ bool IsGlobalBufferPin(const ChipDb& db, const Pin& pin);
 bool ReadChipDb(std::istream& in, std::string_view source, std::string_view package, ChipDb& db,
                 std::string& error);
 
-/// The same from a file; also fails when the file cannot be opened.
+/// The same from a file ("-" for standard input); also fails when the file cannot be
+/// opened, is no regular file or is larger than Port::kMaxInputBytes.
 bool ReadChipDbFile(const std::string& path, std::string_view package, ChipDb& db,
                     std::string& error);
 

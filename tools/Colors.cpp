@@ -69,7 +69,8 @@ std::vector<Group> Collect() {
     return groups;
 }
 
-int Draw(const std::vector<Group>& groups, const std::string& path, const std::string& source) {
+int Draw(const std::vector<Group>& groups, const std::string& path, const std::string& source,
+         const std::string& schemePath) {
     const double swatch = 22;
     const double left = 20;
     const double labelWidth = 160;
@@ -112,7 +113,7 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
         }
     }
     std::string error;
-    if (!WriteTextFile(path, svg.Finish(), error)) {
+    if (!WriteTextFile(path, svg.Finish(), error, {schemePath})) {
         return Refused(kCommand, error);
     }
     std::printf("Swatches written to %s\n", path.c_str());
@@ -149,7 +150,7 @@ int Run(const ParsedArgs& args) {
         }
     }
     if (args.Has("--svg")) {
-        return Draw(groups, args.Value("--svg"), source);
+        return Draw(groups, args.Value("--svg"), source, keys.GetPath().str());
     }
     return kExitOk;
 }

@@ -24,6 +24,10 @@ int UsageError(const std::string& command, const std::string& why);
 /// Prints "venlomer CMD: WHY" on stderr; returns kExitRefused.
 int Refused(const std::string& command, const std::string& why);
 
+/// How many error messages the library has shown so far; a refusal that follows none
+/// must state its reason itself.
+int LibraryErrorCount();
+
 /// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
 /// then in share/venlomer beside the program's bin folder. Empty when not found.
 std::string FindDataFile(const std::string& name);

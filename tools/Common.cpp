@@ -1,6 +1,8 @@
 //===-- tools/Common.cpp - what the subcommands share ---------------------------===//
 #include "Commands.h"
 
+#include "Port/SafeFile.h"
+
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -9,13 +11,14 @@
 namespace VnTool {
 
 int UsageError(const std::string& command, const std::string& why) {
-    std::fprintf(stderr, "venlomer %s: %s (see venlomer %s --help)\n", command.c_str(), why.c_str(),
-                 command.c_str());
+    std::fprintf(stderr, "venlomer %s: %s (see venlomer %s --help)\n", command.c_str(),
+                 Port::Printable(why).c_str(), command.c_str());
     return kExitUsage;
 }
 
 int Refused(const std::string& command, const std::string& why) {
-    std::fprintf(stderr, "venlomer %s: %s\n", command.c_str(), why.c_str());
+    // Reasons quote names from files and the command line; a terminal must not obey them.
+    std::fprintf(stderr, "venlomer %s: %s\n", command.c_str(), Port::Printable(why).c_str());
     return kExitRefused;
 }
 

@@ -15,6 +15,7 @@
 #include "VnI/IDeviceResource.h"
 #include "VnI/ITreeNode.h"
 #include "VnI/PropertyType.h"
+#include "devdata/PM_DEVKEY.h"
 #include "s/ColorManager.h"
 #include "s/DeviceResource.h"
 #include "s/FindItr.h"
@@ -578,6 +579,12 @@ void Search(Model& m, const Options& options, const Ptr<VnI::IProperty>& wanted)
     std::printf("Highlighted: %d pins\n", highlighted);
 }
 
+// The colour scheme the library read is an input too: a picture must never replace it.
+std::string SchemePath() {
+    PM_DEVKEY keys("rareroded.acd", nullptr, 0, 1, 0);
+    return keys.GetPath().str();
+}
+
 int Draw(Model& m, const ChipDb& db, const Options& options) {
     const double cell = 22;
     const double margin = 30;
@@ -674,7 +681,7 @@ int Draw(Model& m, const ChipDb& db, const Options& options) {
     svg.Text(legendX + 20, y + 11, "search match", 12);
 
     std::string error;
-    if (!WriteTextFile(options.svg, svg.Finish(), error)) {
+    if (!WriteTextFile(options.svg, svg.Finish(), error, {options.chipDb, SchemePath()})) {
         return Refused(kCommand, error);
     }
     if (g_usedFallbackColor) {
@@ -710,10 +717,10 @@ int Run(const ParsedArgs& args) {
     if (!options.note.empty()) {
         std::printf("Note: %s\n", options.note.c_str());
     }
-    std::printf("Device %s (%d x %d tiles) from %s, package %s: %zu tiles, %zu pins\n",
-                db.device.c_str(), db.width, db.height, options.chipDb.c_str(),
-                db.package.empty() ? "(none)" : db.package.c_str(), db.tiles.size(),
-                db.pins.size());
+    std::printf(
+        "Device %s (%d x %d tiles) from %s, package %s: %zu tiles, %zu pins\n", db.device.c_str(),
+        db.width, db.height, options.chipDb == "-" ? "standard input" : options.chipDb.c_str(),
+        db.package.empty() ? "(none)" : db.package.c_str(), db.tiles.size(), db.pins.size());
     BuildTree(model);
     PrintTree(model);
     if (options.search) {

@@ -25,11 +25,18 @@ bool Exists(const std::string& path) {
 int RunStub(const ParsedArgs& args) {
     const std::string& ngd = args.operands[0];
     const std::string& ngc = args.operands[1];
+    // The library tells these apart only in debug lines, which are not shown by default.
+    if (ngd.empty() || ngc.empty()) {
+        return Refused("ngc-stub", std::string("no stub made: the ") +
+                                       (ngd.empty() ? "NGD" : "NGC") + " file name is empty");
+    }
     bool existed = Exists(ngc);
+    const int errorsBefore = LibraryErrorCount();
     if (!Vn::Eng::Utilities::CreateNGCFromNGD(ngd.c_str(), ngc.c_str())) {
         return Refused("ngc-stub", "no stub made from " + ngd +
-                                       " (the library's message above says why; --verbose "
-                                       "shows its debug lines)");
+                                       (LibraryErrorCount() > errorsBefore
+                                            ? " (the library's message above says why)"
+                                            : " (the library gave no reason)"));
     }
     if (existed) {
         std::printf("%s exists already and was left as it is; the library counts that as done\n",
@@ -42,9 +49,17 @@ int RunStub(const ParsedArgs& args) {
 
 int RunNew(const ParsedArgs& args) {
     const auto& o = args.operands;
+    if (o[0].empty()) {
+        return Refused("ngc-new", "no stub made: the NGC file name is empty");
+    }
+    const bool existed = Exists(o[0]);
+    const int errorsBefore = LibraryErrorCount();
     if (!Vn::Eng::Utilities::CreateNGC(o[0].c_str(), o[1].c_str(), o[2].c_str(), o[3].c_str())) {
-        return Refused("ngc-new", "the design-model library refused to write " + o[0] +
-                                      (Exists(o[0]) ? " (the file exists already)" : ""));
+        std::string why = existed ? " (the file exists already)"
+                          : LibraryErrorCount() > errorsBefore
+                              ? " (the library's message above says why)"
+                              : " (the library gave no reason)";
+        return Refused("ngc-new", "the design-model library refused to write " + o[0] + why);
     }
     std::printf("Stub netlist database written to %s: design %s, part %s, root block %s\n",
                 o[0].c_str(), o[1].c_str(), o[2].c_str(), o[3].c_str());

@@ -1,10 +1,9 @@
 //===-- tools/Svg.cpp - a minimal SVG document writer ---------------------------===//
 #include "Svg.h"
 
-#include <cerrno>
+#include "Port/SafeFile.h"
+
 #include <cstdio>
-#include <cstring>
-#include <fstream>
 
 namespace VnTool {
 
@@ -36,10 +35,51 @@ std::string HexColor(int red, int green, int blue) {
     return buffer;
 }
 
+namespace {
+
+// The length of the well-formed UTF-8 sequence at text[i] that XML may hold, or 0: overlong
+// forms, surrogates, code points past U+10FFFF and U+FFFE/U+FFFF are not characters.
+std::size_t XmlCharLength(std::string_view text, std::size_t i) {
+    const auto byte = [&](std::size_t k) { return static_cast<unsigned char>(text[k]); };
+    const unsigned char lead = byte(i);
+    std::size_t length = 0;
+    char32_t code = 0;
+    if (lead >= 0xc2 && lead <= 0xdf) {
+        length = 2;
+        code = lead & 0x1f;
+    } else if (lead >= 0xe0 && lead <= 0xef) {
+        length = 3;
+        code = lead & 0x0f;
+    } else if (lead >= 0xf0 && lead <= 0xf4) {
+        length = 4;
+        code = lead & 0x07;
+    } else {
+        return 0;
+    }
+    if (i + length > text.size()) {
+        return 0;
+    }
+    for (std::size_t k = 1; k < length; ++k) {
+        if ((byte(i + k) & 0xc0) != 0x80) {
+            return 0;
+        }
+        code = (code << 6) | (byte(i + k) & 0x3f);
+    }
+    const bool overlong = (length == 3 && code < 0x800) || (length == 4 && code < 0x10000);
+    const bool surrogate = code >= 0xd800 && code <= 0xdfff;
+    if (overlong || surrogate || code > 0x10ffff || code == 0xfffe || code == 0xffff) {
+        return 0;
+    }
+    return length;
+}
+
+} // namespace
+
 std::string XmlEscape(std::string_view text) {
     std::string out;
     out.reserve(text.size());
-    for (char c : text) {
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const char c = text[i];
         switch (c) {
         case '&':
             out += "&amp;";
@@ -57,11 +97,18 @@ std::string XmlEscape(std::string_view text) {
             out += "&apos;";
             break;
         default:
-            // Control characters other than tab and newline are not allowed in XML 1.0.
             if (static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n') {
+                // Control characters other than tab and newline are not allowed in XML 1.0.
                 out += '?';
-            } else {
+            } else if (static_cast<unsigned char>(c) < 0x80) {
                 out += c;
+            } else if (const std::size_t length = XmlCharLength(text, i); length > 0) {
+                out.append(text.substr(i, length));
+                i += length - 1;
+            } else {
+                // Names from a file in another encoding: the document is declared UTF-8,
+                // so a byte that is no character becomes U+FFFD, one per byte.
+                out += "\xef\xbf\xbd";
             }
         }
     }
@@ -104,30 +151,9 @@ std::string SvgWriter::Finish() const {
            m_body + "</svg>\n";
 }
 
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error) {
-    // Written beside the target and renamed over it, so that a full disk or a kill never
-    // leaves a truncated picture under the name the user asked for.
-    std::string temporary = path + ".part";
-    {
-        std::ofstream out(temporary, std::ios::binary | std::ios::trunc);
-        if (!out) {
-            error = "cannot write " + path + ": " + std::strerror(errno);
-            return false;
-        }
-        out << text;
-        out.flush();
-        if (!out) {
-            error = "cannot write " + path + ": " + std::strerror(errno);
-            std::remove(temporary.c_str());
-            return false;
-        }
-    }
-    if (std::rename(temporary.c_str(), path.c_str()) != 0) {
-        error = "cannot write " + path + ": " + std::strerror(errno);
-        std::remove(temporary.c_str());
-        return false;
-    }
-    return true;
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs) {
+    return Port::WriteFileSafely(path, text, error, inputs);
 }
 
 } // namespace VnTool

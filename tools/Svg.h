@@ -10,13 +10,15 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace VnTool {
 
 /// An RGB colour as "#rrggbb".
 std::string HexColor(int red, int green, int blue);
 
-/// Escapes &, <, >, " and ' for use in XML text and attribute values.
+/// Escapes &, <, >, " and ' for use in XML text and attribute values; control characters
+/// become '?' and bytes that are not UTF-8 characters become U+FFFD.
 std::string XmlEscape(std::string_view text);
 
 class SvgWriter {
@@ -41,7 +43,9 @@ private:
     double m_height;
 };
 
-/// Writes text to path. Returns false with a reason in error when it cannot.
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error);
+/// Writes text to path through the safe writer (Port/SafeFile.h): whole or not at all,
+/// never over one of `inputs`. Returns false with a reason in error when it cannot.
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs = {});
 
 } // namespace VnTool

@@ -8,7 +8,9 @@
 #include "Commands.h"
 
 #include "Port/MsgMan.h"
+#include "Port/SafeFile.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
@@ -41,6 +43,7 @@ void PrintToolHelp() {
 }
 
 bool g_verbose = false;
+int g_libraryErrors = 0;
 
 // Library messages share stderr with the tool's own reasons, tagged so that a reader can
 // tell which of the two spoke.
@@ -49,8 +52,17 @@ void ShowMessage(const Port::Message& message) {
     while (!text.empty() && text.back() == '\n') {
         text.pop_back();
     }
+    // Message texts quote names from files; line breaks stay, other controls are shown.
+    std::string shown;
+    for (std::size_t start = 0; start <= text.size();) {
+        std::size_t end = std::min(text.find('\n', start), text.size());
+        shown += (start == 0 ? "" : "\n") + Port::Printable(text.substr(start, end - start));
+        start = end + 1;
+    }
+    text = shown;
     switch (message.severity) {
     case Port::Severity::Error:
+        ++g_libraryErrors;
         std::fprintf(stderr, "[library error] %s\n", text.c_str());
         break;
     case Port::Severity::Status:
@@ -94,6 +106,10 @@ void FindOwnDataOrRestart(char** argv) {
 
 } // namespace
 
+int VnTool::LibraryErrorCount() {
+    return g_libraryErrors;
+}
+
 int main(int argc, char** argv) {
     FindOwnDataOrRestart(argv);
     std::vector<std::string> args(argv + 1, argv + argc);
@@ -118,7 +134,8 @@ int main(int argc, char** argv) {
         }
     }
     if (command == nullptr) {
-        std::fprintf(stderr, "venlomer: unknown command %s (see venlomer --help)\n", name.c_str());
+        std::fprintf(stderr, "venlomer: unknown command %s (see venlomer --help)\n",
+                     Port::Printable(name).c_str());
         return VnTool::kExitUsage;
     }
     VnTool::ParsedArgs parsed;
@@ -139,7 +156,7 @@ int main(int argc, char** argv) {
     } catch (const std::exception& e) {
         // The outside libraries may throw what the library lets pass; the user gets a
         // reason rather than an abort.
-        std::fprintf(stderr, "venlomer %s: %s\n", name.c_str(), e.what());
+        std::fprintf(stderr, "venlomer %s: %s\n", name.c_str(), Port::Printable(e.what()).c_str());
     }
     std::fflush(stdout);
     Port::SetMessageSink({});

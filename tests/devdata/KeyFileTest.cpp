@@ -57,6 +57,23 @@ TEST_F(KeyFile, ReadsEntriesAndFieldsAroundCommentsBlanksAndSpaces) {
     EXPECT_EQ(r.Entry("LAST", 0), (std::vector<int>{40, 41, 42}));
 }
 
+TEST_F(KeyFile, TakesCrLfAndCrCrLfAsLineEndsAlike) {
+    for (const char* end : {"\r", "\n", "\r\n"}) {
+        SCOPED_TRACE(testing::PrintToString(std::string(end)));
+        const std::string e(end);
+        Reader r(Write("# a scheme saved by some editor" + e + "A = 1,2,3" + e + e + "B = 4" + e));
+        ASSERT_EQ(r.keys.get_validity(), 1);
+        EXPECT_EQ(r.Entry("A", 0), (std::vector<int>{1, 2, 3}));
+        EXPECT_EQ(r.Entry("B", 0), (std::vector<int>{4, 0, 0}));
+    }
+    // Mixed ends count one line each, so a message names the right line.
+    VnTest::MessageCapture capture;
+    Reader bad(Write("A = 1\rB = 2\r\nC = 3\n\rD = x\n"));
+    EXPECT_EQ(bad.keys.get_validity(), 0);
+    ASSERT_EQ(capture.Errors().size(), 1u);
+    EXPECT_NE(capture.Errors()[0].find("line 5:"), std::string::npos) << capture.Errors()[0];
+}
+
 TEST_F(KeyFile, KeepsNegativeLargeAndZeroPaddedValuesExactly) {
     Reader r(Write("V = -1, 2147483647, -2147483648 : 300, 007, -0\n"));
     ASSERT_EQ(r.keys.get_validity(), 1);

@@ -44,6 +44,15 @@ TEST(ToolArgs, ValuesFlagsAndOperandsAreTakenInAnyOrder) {
 TEST(ToolSvg, TextFromOutsideIsEscaped) {
     EXPECT_EQ(VnTool::XmlEscape("<a & 'b' \"c\">"), "&lt;a &amp; &apos;b&apos; &quot;c&quot;&gt;");
     EXPECT_EQ(VnTool::XmlEscape(std::string("x\x01y", 3)), "x?y");
+    // Text that is UTF-8 passes; every byte that is no character is replaced.
+    EXPECT_EQ(VnTool::XmlEscape("\xc3\xa9\xe2\x82\xac\xf0\x9f\x98\x80"),
+              "\xc3\xa9\xe2\x82\xac\xf0\x9f\x98\x80");
+    const std::string bad = "\xef\xbf\xbd";
+    EXPECT_EQ(VnTool::XmlEscape("A\xe9"), "A" + bad);              // Latin-1
+    EXPECT_EQ(VnTool::XmlEscape("\xc0\xaf"), bad + bad);           // overlong
+    EXPECT_EQ(VnTool::XmlEscape("\xed\xa0\x80"), bad + bad + bad); // surrogate
+    EXPECT_EQ(VnTool::XmlEscape("\xef\xbf\xbe"), bad + bad + bad); // U+FFFE
+    EXPECT_EQ(VnTool::XmlEscape("\xe2\x82"), bad + bad);           // cut short
     EXPECT_EQ(VnTool::HexColor(255, 0, 16), "#ff0010");
 }
 

@@ -80,6 +80,23 @@ void ExpectCountsMatch(const std::string& path) {
     }
 }
 
+// The tile lines of a whole w x h device: IO tiles around the edge, logic inside, no tile
+// in the corners, as the family's databases have them.
+std::string Tiles(int w, int h) {
+    std::string text;
+    for (int x = 0; x < w; ++x) {
+        for (int y = 0; y < h; ++y) {
+            const bool xEdge = x == 0 || x == w - 1;
+            const bool yEdge = y == 0 || y == h - 1;
+            if (!(xEdge && yEdge)) {
+                text += std::string(xEdge || yEdge ? ".io_tile " : ".logic_tile ") +
+                        std::to_string(x) + " " + std::to_string(y) + "\n";
+            }
+        }
+    }
+    return text;
+}
+
 bool Read(const std::string& text, ChipDb& db, std::string& error, std::string_view package = {}) {
     std::istringstream in(text);
     return VnTool::ReadChipDb(in, "test.txt", package, db, error);
@@ -118,8 +135,7 @@ TEST(ChipDbReader, PinsFallIntoTheBankOfTheirEdge) {
 
     ChipDb db;
     std::string error;
-    ASSERT_TRUE(Read(".device t 4 4 0\n.pins p\nT 1 3 0\nR 3 2 1\nB 2 0 0\nL 0 1 1\n"
-                     ".io_tile 1 3\n.io_tile 3 2\n.io_tile 2 0\n.io_tile 0 1\n",
+    ASSERT_TRUE(Read(".device t 4 4 0\n.pins p\nT 1 3 0\nR 3 2 1\nB 2 0 0\nL 0 1 1\n" + Tiles(4, 4),
                      db, error))
         << error;
     ASSERT_EQ(db.pins.size(), 4u);
@@ -135,14 +151,34 @@ TEST(ChipDbReader, SkippedSectionsAreNotParsedAndLayoutNoiseIsAccepted) {
     std::string error;
     // Windows line ends, comments, blank lines, tabs, and garbage inside sections the
     // tool does not need.
-    ASSERT_TRUE(Read("# comment\r\n\r\n.device t\t4 4 0\r\n.net 1\r\n!! whatever ~~\r\n"
-                     ".buffer 1 1 2 B0[1]\r\n01 3\r\n.logic_tile 1 1\r\n.dsp0_tile 2 2\r\n"
-                     "anything at all\r\n",
+    ASSERT_TRUE(Read("# comment\r\n\r\n.device t\t4 3 0\r\n.net 1\r\n!! whatever ~~\r\n"
+                     ".buffer 1 1 2 B0[1]\r\n01 3\r\n.logic_tile 1 1\r\n.dsp0_tile 2 1\r\n"
+                     "anything at all\r\n.io_tile\t1 0\r\n.io_tile 2 0\r\n.io_tile 1 2\r\n"
+                     ".io_tile 2 2\r\n.io_tile 0 1\r\n.ipcon_tile 3 1\r\n",
                      db, error))
         << error;
-    EXPECT_EQ(db.tiles.size(), 1u);
+    // The DSP and IP tiles fill their place but are not drawn.
+    EXPECT_EQ(db.tiles.size(), 6u);
     EXPECT_TRUE(db.pins.empty());
     EXPECT_TRUE(db.package.empty());
+}
+
+TEST(ChipDbReader, EveryCutOfAWholeDeviceIsRefused) {
+    const std::string whole = ".device t 5 4 0\n.pins p\nA 1 3 0\nB 4 1 1\n" + Tiles(5, 4) +
+                              ".net 0\n1 1 span4_horz_0\n2 1 span4_horz_1\n";
+    ChipDb db;
+    std::string error;
+    ASSERT_TRUE(Read(whole, db, error)) << error;
+    // Cut anywhere but at a line end in the trailing bulk, the file cannot pass for whole.
+    const std::size_t bulk = whole.find(".net");
+    for (std::size_t cut = 1; cut < whole.size(); ++cut) {
+        if (cut >= bulk && whole[cut - 1] == '\n') {
+            continue;
+        }
+        SCOPED_TRACE(cut);
+        EXPECT_FALSE(Read(whole.substr(0, cut), db, error));
+        EXPECT_EQ(error.rfind("test.txt:", 0), 0u) << error;
+    }
 }
 
 TEST(ChipDbReader, AnUnknownPackageIsRefusedWithTheNamesThereAre) {
@@ -204,6 +240,8 @@ TEST(ChipDbReader, MalformedInputIsRefusedWithTheLine) {
         {".device 8k 34 x 10\n", "test.txt:1:", ".device wants"},
         {".device 8k 0 34 10\n", "test.txt:1:", "size out of range"},
         {".device 8k 99999 34 10\n", "test.txt:1:", "size out of range"},
+        {".device 8k 129 34 10\n", "test.txt:1:", "size out of range"},
+        {".device 8k 2147483648 34 10\n", "test.txt:1:", ".device wants"},
         {".device a 4 4 0\n\n.device b 4 4 0\n", "test.txt:3:", "second .device"},
         {".logic_tile 1 1\n.device a 4 4 0\n", "test.txt:1:", "before the .device"},
         {".device a 4 4 0\n.io_tile 1\n", "test.txt:2:", "two coordinates"},
@@ -211,15 +249,26 @@ TEST(ChipDbReader, MalformedInputIsRefusedWithTheLine) {
         {".device a 4 4 0\n.io_tile 4 1\n", "test.txt:2:", "outside the device grid"},
         {".device a 4 4 0\n.io_tile -1 1\n", "test.txt:2:", "outside the device grid"},
         {".device a 4 4 0\n.io_tile 0 1\n.logic_tile 0 1\n", "test.txt:3:", "second tile"},
+        {".device a 4 4 0\n.io_tile 0 1\n.dsp1_tile 0 1\n", "test.txt:3:", "second tile"},
         {".device a 4 4 0\n.io_tile 0 1\n1 2\n", "test.txt:3:", "unexpected line"},
         {".device a 4 4 0\n.pins p\nA1 0 1\n", "test.txt:3:", "a pin line wants"},
         {".device a 4 4 0\n.pins p\nA1 0 1 -1\n", "test.txt:3:", "negative IO block"},
+        {".device a 4 4 0\n.pins p\nA1 0 1 2147483647\n",
+         "test.txt:3:", "names IO block 2147483647"},
+        {".device a 4 4 0\n.pins p\nA1 0 1 2\n", "test.txt:3:", "blocks 0 and 1"},
+        {".device a 4 4 0\n.pins p\nA1 0 1 1\nA2 0 1 0\nA3 0 1 1\n",
+         "test.txt:5:", "pin A3 claims IO block 1 of tile 0 1, which pin A1 has"},
+        {".device a 4 4 0\n.io_tilx 0 1\n", "test.txt:2:", "unknown section .io_tilx"},
+        {".device a 4 4 0\n.pins p\nA1 0 1 0\n.pins q\nA1 0 1 0\n.io_tile 0 1\n",
+         "test.txt:6:", "the file ends with 1 of the 12 tiles of a 4 x 4 device"},
+        {".device a 2 2 0\n.net 1\n1 2 sp4", "test.txt:3:", "no line end: the file is cut short"},
         {".device a 4 4 0\n.pins p\nA1 0 1 0\nA1 0 1 1\n", "test.txt:4:", "listed twice"},
         {".device a 4 4 0\n.pins\n", "test.txt:2:", "one package name"},
         {".device a 4 4 0\n.pins p\n.pins p\n", "test.txt:3:", "listed twice"},
         // The pin's tile is checked once all tiles are known; the pin's own line is named.
-        {".device a 4 4 0\n.pins p\n\nA1 1 1 0\n.logic_tile 1 1\n", "test.txt:4:", "no IO tile"},
-        {".device a 4 4 0\n.pins p\nA1 0 2 0\n", "test.txt:3:", "no IO tile"},
+        {".device a 3 3 0\n.pins p\n\nA1 0 1 0\n.logic_tile 0 1\n.logic_tile 1 1\n"
+         ".io_tile 1 0\n.io_tile 1 2\n.io_tile 2 1\n",
+         "test.txt:4:", "no IO tile"},
         {".device a 4 4 0\n.pins p\nA1 1 2 0\n.io_tile 1 2\n", "test.txt:3:", "on no edge"},
         {".device a 4 4 0\n.gbufpin\n0 1 0\n", "test.txt:3:", ".gbufpin line wants"},
         {".device a 4 4 0\n.gbufpin\n0 9 0 1\n", "test.txt:3:", "outside the device"},

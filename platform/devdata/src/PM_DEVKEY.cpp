@@ -4,13 +4,14 @@
 #include "devdata/PM_DEVKEY.h"
 
 #include "Port/MsgMan.h"
+#include "Port/SafeFile.h"
 
 #include <algorithm>
 #include <climits>
 #include <cstdint>
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
+#include <istream>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -168,6 +169,33 @@ bool ParseLine(std::string_view line, std::string& key, Value& value, std::strin
     }
 }
 
+// One line of the file, without its end. CR, LF and CR LF all end a line: a scheme saved
+// by an editor that writes CR alone must not read as one long comment.
+bool NextLine(std::istream& in, std::string& line) {
+    line.clear();
+    std::streambuf* buffer = in.rdbuf();
+    using Traits = std::char_traits<char>;
+    Traits::int_type c = buffer->sbumpc();
+    if (Traits::eq_int_type(c, Traits::eof())) {
+        in.setstate(std::ios::eofbit);
+        return false;
+    }
+    for (; !Traits::eq_int_type(c, Traits::eof()); c = buffer->sbumpc()) {
+        const char ch = Traits::to_char_type(c);
+        if (ch == '\n') {
+            return true;
+        }
+        if (ch == '\r') {
+            if (Traits::eq_int_type(buffer->sgetc(), Traits::to_int_type('\n'))) {
+                buffer->sbumpc();
+            }
+            return true;
+        }
+        line.push_back(ch);
+    }
+    return true;
+}
+
 std::filesystem::path FindFile(const char* name, bool search) {
     namespace fs = std::filesystem;
     std::error_code ec;
@@ -218,24 +246,23 @@ struct PM_DEVKEY::Keys {
     // Reads the whole file; any fault empties the keys again, so a rejected file never
     // leaves half its keys behind.
     void Read(const std::filesystem::path& file, bool report) {
-        std::ifstream in(file, std::ios::binary);
-        if (!in) {
+        Port::InputFile input;
+        std::string why;
+        if (!input.Open(file.string(), why)) {
             if (report) {
                 Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
-                    .issueError("Key file %s cannot be read\n", path.c_str());
+                    .issueError("Key file %s cannot be read: %s\n", path.c_str(), why.c_str());
             }
             return;
         }
+        std::istream& in = input.Stream();
         std::unordered_map<std::string, unsigned long> firstLine;
         std::string line;
         std::string key;
         std::string reason;
         unsigned long lineNumber = 0;
-        while (std::getline(in, line)) {
+        while (NextLine(in, line)) {
             ++lineNumber;
-            if (!line.empty() && line.back() == '\r') {
-                line.pop_back();
-            }
             key.clear();
             Value value;
             if (!ParseLine(line, key, value, reason)) {
@@ -254,11 +281,12 @@ struct PM_DEVKEY::Keys {
             }
             values.emplace(std::move(key), std::move(value));
         }
-        if (in.bad()) {
+        if (in.bad() || input.Failed(why)) {
             values.clear();
             if (report) {
                 Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
-                    .issueError("Key file %s cannot be read\n", path.c_str());
+                    .issueError("Key file %s cannot be read: %s\n", path.c_str(),
+                                why.empty() ? "read error" : why.c_str());
             }
             return;
         }

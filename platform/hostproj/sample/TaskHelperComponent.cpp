@@ -12,6 +12,7 @@
 
 #include "CitP/Factory.h"
 #include "Port/MsgMan.h"
+#include "Port/SafeFile.h"
 #include "hostproj/IProject.h"
 #include "hostproj/TaskHelper.h"
 
@@ -165,18 +166,16 @@ std::shared_ptr<const Description> ReadDescription() {
         return description;
     }
     std::string text;
-    bool readable = false;
-    if (std::FILE* file = std::fopen(path, "rb")) {
-        char buffer[4096];
-        std::size_t got = 0;
-        while ((got = std::fread(buffer, 1, sizeof buffer, file)) > 0) {
-            text.append(buffer, got);
+    std::string why;
+    // A FIFO or a device named by mistake is refused rather than waited on or read
+    // without end.
+    if (!Port::ReadRegularFile(path, text, why)) {
+        const std::string prefix = std::string(path) + ": ";
+        if (why.rfind(prefix, 0) == 0) {
+            why.erase(0, prefix.size());
         }
-        readable = std::ferror(file) == 0;
-        std::fclose(file);
-    }
-    if (!readable) {
-        Report(__LINE__).issueError("project description %s cannot be read\n", path);
+        Report(__LINE__).issueError("project description %s cannot be read: %s\n", path,
+                                    why.c_str());
         return std::make_shared<Description>();
     }
     ParseError error;
