@@ -150,7 +150,7 @@ int Run(const ParsedArgs& args) {
         }
     }
     if (args.Has("--svg")) {
-        return Draw(groups, args.Value("--svg"), source, keys.GetPath().str());
+        return Draw(groups, args.Value("--svg"), source, path);
     }
     return kExitOk;
 }
