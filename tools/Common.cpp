@@ -2,6 +2,7 @@
 #include "Commands.h"
 
 #include "Port/SafeFile.h"
+#include "Port/SearchPath.h"
 
 #include <cstdio>
 #include <cstdlib>
@@ -22,29 +23,28 @@ int Refused(const std::string& command, const std::string& why) {
     return kExitRefused;
 }
 
+std::filesystem::path ProgramFile() {
+    std::error_code ec;
+    std::filesystem::path self = std::filesystem::read_symlink("/proc/self/exe", ec);
+    return ec ? std::filesystem::path() : self;
+}
+
+std::filesystem::path OwnDataFolder() {
+    const std::filesystem::path self = ProgramFile();
+    return self.empty() ? self : self.parent_path().parent_path() / "share" / "venlomer";
+}
+
 std::string FindDataFile(const std::string& name) {
     namespace fs = std::filesystem;
     std::error_code ec;
-    if (const char* path = std::getenv("VENLOMER_DATA_PATH")) {
-        std::string folders(path);
-        std::size_t start = 0;
-        while (start <= folders.size()) {
-            std::size_t end = folders.find(':', start);
-            if (end == std::string::npos) {
-                end = folders.size();
-            }
-            if (end > start) {
-                fs::path candidate = fs::path(folders.substr(start, end - start)) / name;
-                if (fs::is_regular_file(candidate, ec)) {
-                    return candidate.string();
-                }
-            }
-            start = end + 1;
+    for (const std::string& folder : Port::SearchPathFromEnv("VENLOMER_DATA_PATH")) {
+        fs::path candidate = fs::path(folder) / name;
+        if (fs::is_regular_file(candidate, ec)) {
+            return candidate.string();
         }
     }
-    fs::path self = fs::read_symlink("/proc/self/exe", ec);
-    if (!ec) {
-        fs::path candidate = self.parent_path().parent_path() / "share" / "venlomer" / name;
+    if (const fs::path own = OwnDataFolder(); !own.empty()) {
+        fs::path candidate = own / name;
         if (fs::is_regular_file(candidate, ec)) {
             return candidate.string();
         }
