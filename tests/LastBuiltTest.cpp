@@ -1,4 +1,4 @@
-//===-- tests/LastBuiltTest.cpp - the per-thread last-built value ---------------===//
+//===-- tests/LastBuiltTest.cpp - the last-built value is rebuilt only for a new key -===//
 #include "Port/LastBuilt.h"
 
 #include <gtest/gtest.h>

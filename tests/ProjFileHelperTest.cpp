@@ -1,4 +1,4 @@
-//===-- tests/ProjFileHelperTest.cpp - finding the project's files via the host -===//
+//===-- tests/ProjFileHelperTest.cpp - the lookup finds the files; the host keeps nothing -===//
 //
 // Each test writes a project description for the sample host, points VENLOMER_PROJECT at
 // it and runs the lookup. After every lookup the host must hold nothing of the lookup's:

@@ -1,4 +1,4 @@
-//===-- tests/SearchPathTest.cpp - colon-separated search paths -----------------===//
+//===-- tests/SearchPathTest.cpp - search paths split into folders, empty ones left out -===//
 #include "Port/SearchPath.h"
 
 #include <gmock/gmock.h>

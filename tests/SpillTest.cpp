@@ -1,4 +1,4 @@
-//===-- tests/SpillTest.cpp - the entries of a key that stands more than once ---===//
+//===-- tests/SpillTest.cpp - a spill keeps entries oldest first and drops either end -===//
 #include "s/internal/Spill.h"
 
 #include <gtest/gtest.h>

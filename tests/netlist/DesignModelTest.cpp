@@ -1,5 +1,9 @@
+//===-- tests/netlist/DesignModelTest.cpp - netlist files told apart, read, written whole -===//
+//
 // The design-model library: telling netlist files apart, reading them back, and writing
 // them all or nothing.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 #include "NetlistFiles.h"
 #include "Slots.h"
