@@ -7,6 +7,7 @@
 #include "s/internal/Shapes.h"
 
 #include "s/internal/PointerIndex.h"
+#include "s/internal/Spill.h"
 
 #include <cstdint>
 #include <deque>
@@ -34,13 +35,8 @@ public:
     std::int64_t RemoveAll() override { return m_owner->RemoveAll(); }
 };
 
-// The entries of a resource highlighted more than once. Entries are only ever appended
-// at the list's end and removed oldest first, so a queue keeps them in order.
-struct Entries {
-    VnI::IDeviceResource* resource;
-    List::iterator oldest;
-    std::deque<List::iterator> later;
-};
+// The entries of a resource highlighted more than once, oldest first.
+using Entries = detail::Spill<VnI::IDeviceResource, List::iterator>;
 
 // One resource in the index, in eight bytes: the list node of its only entry with 16
 // bits of its address's hash above the node's address (the node holds the resource,
@@ -53,10 +49,10 @@ public:
     bool Boxed() const { return (m_bits & 1) != 0; }
     Entries* Box() const { return reinterpret_cast<Entries*>(m_bits & ~std::uint64_t{1}); }
     List::iterator Only() const { return Bits::From(m_bits); }
-    const VnI::IDeviceResource* KeyOf() const { return Boxed() ? Box()->resource : *Only(); }
+    const VnI::IDeviceResource* KeyOf() const { return Boxed() ? Box()->GetKey() : *Only(); }
     bool Holds(const VnI::IDeviceResource* key, std::uint64_t hash) const {
         if (Boxed()) {
-            return Box()->resource == key;
+            return Box()->GetKey() == key;
         }
         return (m_bits >> 48) == (hash >> 48) && *Only() == key;
     }
@@ -130,9 +126,10 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     const std::uint64_t hash = HighlightManagerImp::Index::Hash(resource);
     if (HighlightManagerImp::Slot* slot = index.Find(resource)) {
         if (slot->Boxed()) {
-            slot->Box()->later.push_back(at);
+            slot->Box()->Append(at);
         } else {
-            auto box = std::make_unique<Entries>(Entries{resource, slot->Only(), {at}});
+            auto box = std::make_unique<Entries>(resource, slot->Only());
+            box->Append(at);
             slot->SetBox(box.release());
         }
     } else {
@@ -140,7 +137,7 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
         // in a box of its own.
         auto box = HighlightManagerImp::Slot::Bits::Packs(at)
                        ? nullptr
-                       : std::make_unique<Entries>(Entries{resource, at, {}});
+                       : std::make_unique<Entries>(resource, at);
         HighlightManagerImp::Slot& added = index.Add(resource);
         if (box) {
             added.SetBox(box.release());
@@ -166,11 +163,8 @@ std::int64_t HighlightManager::RemoveHighlightedItem(VnI::IDeviceResource* resou
         return 1;
     }
     HighlightManagerImp::Entries* entries = slot->Box();
-    m_imp->m_highlightedItems.erase(entries->oldest);
-    if (!entries->later.empty()) {
-        entries->oldest = entries->later.front();
-        entries->later.pop_front();
-    } else {
+    m_imp->m_highlightedItems.erase(entries->Oldest());
+    if (!entries->DropOldest()) {
         delete entries;
         m_imp->m_index.Erase(slot);
     }

@@ -214,6 +214,63 @@ Dpm::IView* FindViewByType(Dpm::IView* start, const Text& wanted) {
     return nullptr;
 }
 
+// ScanDesignUnits over the design units the network lists for `view`.
+void ScanViewUnits(Dpm::IViewNetworkHelp& networkHelp, Dpm::IView* view, Text& ngdFile,
+                   Text& ucfFile) {
+    AutoRelease<Dpm::IDesignUnitIterator> units;
+    networkHelp.GetDesignUnits(view, units.Receive());
+    ScanDesignUnits(units.Get(), ngdFile, ucfFile);
+}
+
+// The project's default view and the help that lists its design units, reached through
+// a project helper made for `project`. Members are released in reverse order, the view
+// network before the helper that handed it out.
+struct DefaultView {
+    AutoRelease<CitI::IInterface> helperObject;
+    Dpm::IViewNetworkHelp* networkHelp = nullptr;
+    AutoRelease<CitI::IInterface> network;
+    Dpm::IView* view = nullptr;
+};
+
+// False after the debug output that names the interface the host did not give.
+bool OpenDefaultView(IProject* project, DefaultView& out) {
+    CitP::Factory::LoadLibraryFactory(HostProj::kProjectManagerComponent);
+    // The created object is ours even when it turns out not to be a project helper.
+    out.helperObject =
+        AutoRelease<CitI::IInterface>(CitP::Factory::CreateInstance(Dpm::CLSID_ProjectHelper()));
+    AutoCast<Dpm::IProjectHelper> helper(out.helperObject);
+    if (!helper) {
+        Port_MsgManData::debugStub("Cannot get IProjectHelper interface\n");
+        return false;
+    }
+    AutoCast<Dpm::IProjectCompReference> reference(helper);
+    if (!reference) {
+        Port_MsgManData::debugStub("Cannot get IProjectCompReference Interface\n");
+        return false;
+    }
+    reference->SetProject(project);
+    helper->Update();
+
+    AutoCast<Dpm::IViewNetworkHelp> networkHelp(helper);
+    if (!networkHelp) {
+        Port_MsgManData::debugStub("Cannot cast to IViewNetworkHelp interface\n");
+        return false;
+    }
+    out.networkHelp = networkHelp.Get();
+    networkHelp->GetViewNetwork(Dpm::kDefaultViewNetwork, out.network.Receive());
+    if (!out.network) {
+        Port_MsgManData::debugStub("Cannot get DefaultViewNetwork\n");
+        return false;
+    }
+    AutoCast<Dpm::IView> defaultView(out.network);
+    if (!defaultView) {
+        Port_MsgManData::debugStub("Cannot get Dpm::IView interface\n");
+        return false;
+    }
+    out.view = defaultView.Get();
+    return true;
+}
+
 } // namespace
 
 bool ProjFileHelper::GetFilesFromHost(Port::StringBase<char>& projectFile,
@@ -235,40 +292,10 @@ bool ProjFileHelper::GetFilesFromHost(Port::StringBase<char>& projectFile,
     }
     Port_MsgManData::debugStub("ZAM File %s\n", projectFile.c_str());
 
-    CitP::Factory::LoadLibraryFactory(HostProj::kProjectManagerComponent);
-    // The created object is ours even when it turns out not to be a project helper.
-    AutoRelease<CitI::IInterface> created(
-        CitP::Factory::CreateInstance(Dpm::CLSID_ProjectHelper()));
-    AutoCast<Dpm::IProjectHelper> helper(created);
-    if (!helper) {
-        Port_MsgManData::debugStub("Cannot get IProjectHelper interface\n");
+    DefaultView defaultView;
+    if (!OpenDefaultView(project, defaultView)) {
         return false;
     }
-    AutoCast<Dpm::IProjectCompReference> reference(helper);
-    if (!reference) {
-        Port_MsgManData::debugStub("Cannot get IProjectCompReference Interface\n");
-        return false;
-    }
-    reference->SetProject(project);
-    helper->Update();
-
-    AutoCast<Dpm::IViewNetworkHelp> networkHelp(helper);
-    if (!networkHelp) {
-        Port_MsgManData::debugStub("Cannot cast to IViewNetworkHelp interface\n");
-        return false;
-    }
-    AutoRelease<CitI::IInterface> network;
-    networkHelp->GetViewNetwork(Dpm::kDefaultViewNetwork, network.Receive());
-    if (!network) {
-        Port_MsgManData::debugStub("Cannot get DefaultViewNetwork\n");
-        return false;
-    }
-    AutoCast<Dpm::IView> defaultView(network);
-    if (!defaultView) {
-        Port_MsgManData::debugStub("Cannot get Dpm::IView interface\n");
-        return false;
-    }
-
     // Both scans share the slot they do not deliver, and this is kept on purpose: callers
     // have always seen this order of host calls. It does show in the result, though. A
     // scan ends once both of its slots hold a name, so when the default view has a netlist
@@ -278,27 +305,19 @@ bool ProjFileHelper::GetFilesFromHost(Port::StringBase<char>& projectFile,
     // default view, a netlist unit ends the scan at the next constraints unit, so a later
     // constraints unit no longer overwrites it.
     Text scratch;
-    {
-        AutoRelease<Dpm::IDesignUnitIterator> units;
-        networkHelp->GetDesignUnits(defaultView.Get(), units.Receive());
-        ScanDesignUnits(units.Get(), scratch, ucfFile);
-    }
+    ScanViewUnits(*defaultView.networkHelp, defaultView.view, scratch, ucfFile);
     Port_MsgManData::debugStub("UCF File %s\n", ucfFile.c_str());
     if (ucfFile.IsEmpty()) {
         Port_MsgManData::debugStub("Could not find the UCF file\n");
         return false;
     }
 
-    Dpm::IView* translation = FindViewByType(defaultView.Get(), Text("VIEW_Translation"));
+    Dpm::IView* translation = FindViewByType(defaultView.view, Text("VIEW_Translation"));
     if (translation == nullptr) {
         Port_MsgManData::debugStub("Cannot get Dpm::IView interface for VIEW_Translation\n");
         return false;
     }
-    {
-        AutoRelease<Dpm::IDesignUnitIterator> units;
-        networkHelp->GetDesignUnits(translation, units.Receive());
-        ScanDesignUnits(units.Get(), ngdFile, scratch);
-    }
+    ScanViewUnits(*defaultView.networkHelp, translation, ngdFile, scratch);
     Port_MsgManData::debugStub("NGD File %s\n", ngdFile.c_str());
     if (ngdFile.IsEmpty()) {
         Port_MsgManData::debugStub("Could not find the NGD file\n");

@@ -3,13 +3,13 @@
 
 #include "s/Property.h"
 
+#include "Port/LastBuilt.h"
 #include "Port/MsgMan.h"
 #include "Port/Regexp.h"
 #include "s/PossibleEnumValuesItr.h"
 
 #include <climits>
 #include <cmath>
-#include <optional>
 #include <string>
 #include <typeinfo>
 
@@ -65,14 +65,9 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
                    int flags) {
     // A search compares a million values with one pattern: keep the last expression
     // built, so each comparison costs a text compare and one anchored match.
-    struct LastExpression {
-        std::string pattern;
-        int flags = -1;
-        std::optional<Port_Regexp> compiled;
-    };
-    thread_local LastExpression last;
+    thread_local Port::LastBuilt<Port_Regexp> last;
     const int shape = flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
-    if (!last.compiled || last.flags != shape || last.pattern != pattern.view()) {
+    const Port_Regexp& expression = last.Get(pattern.view(), shape, [&] {
         // Case is ignored by the expression itself (ASCII letters, as everywhere else):
         // upper-casing the pattern would turn escapes such as \d, \w and \s into their
         // negations. With the expression ignoring case, upper-casing the value as well
@@ -88,8 +83,8 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
         if ((shape & VnI::MATCH_SUBSTRING) != 0) {
             body += ".*";
         }
-        last.compiled.emplace(std::string_view(body), letterCase);
-        if (last.compiled->IsValid()) {
+        Port_Regexp compiled(std::string_view(body), letterCase);
+        if (compiled.IsValid()) {
             // The match is anchored at the start anyway, so a leading ^ changes no
             // outcome; but it lets the engine test a pattern's literal prefix with one
             // compare before running its automaton, which rejects most values of a
@@ -97,14 +92,13 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
             // decided without it: ^ makes some invalid patterns ("(?)?x") valid.
             Port_Regexp anchored(std::string_view("^" + body), letterCase);
             if (anchored.IsValid()) {
-                last.compiled.emplace(std::move(anchored));
+                return anchored;
             }
         }
-        last.pattern.assign(pattern.view());
-        last.flags = shape;
-    }
+        return compiled;
+    });
     // The value matches when a match of the expression starts at its first byte.
-    return last.compiled->MatchesAtStart(value.view());
+    return expression.MatchesAtStart(value.view());
 }
 
 } // namespace

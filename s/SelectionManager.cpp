@@ -8,6 +8,7 @@
 #include "s/internal/Shapes.h"
 
 #include "s/internal/PointerIndex.h"
+#include "s/internal/Spill.h"
 
 #include <cstdint>
 #include <deque>
@@ -55,26 +56,7 @@ struct Entry {
 
 // Where a holder stands when it needs more than one plain entry: it was selected again
 // after a host cleared its flag by hand, or its entry is part taken.
-struct Positions {
-    VnI::IPropertyHolder* holder;
-    Entry first;
-    std::vector<Entry> more; // later selections, oldest first
-
-    template <class F> void ForEach(F&& f) {
-        f(first);
-        for (Entry& e : more) {
-            f(e);
-        }
-    }
-    // Keeps the oldest entry still in use in `first`; false when none is left.
-    bool Normalize() {
-        while (!first.Used() && !more.empty()) {
-            first = more.front();
-            more.erase(more.begin());
-        }
-        return first.Used();
-    }
-};
+using Positions = detail::Spill<VnI::IPropertyHolder, Entry>;
 
 // One holder in the index, in sixteen bytes. A holder selected once keeps its two list
 // nodes here, each beside 16 bits: the category's low 16 bits above the overall node,
@@ -93,11 +75,11 @@ public:
         return Entry{category, Bits::From(m_inCategory), Bits::From(m_all), true, true};
     }
     const VnI::IPropertyHolder* KeyOf() const {
-        return Boxed() ? Box()->holder : *Bits::From(m_all);
+        return Boxed() ? Box()->GetKey() : *Bits::From(m_all);
     }
     bool Holds(const VnI::IPropertyHolder* key, std::uint64_t hash) const {
         if (Boxed()) {
-            return Box()->holder == key;
+            return Box()->GetKey() == key;
         }
         return (m_inCategory >> 52) == (hash >> 52) && *Bits::From(m_all) == key;
     }
@@ -202,16 +184,16 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
     const Entry entry{type, inCategory.begin(), inAll.begin(), true, true};
     if (Slot* slot = m_index.Find(holder)) {
         if (slot->Boxed()) {
-            slot->Box()->more.push_back(entry);
+            slot->Box()->Append(entry);
         } else {
-            auto box = std::make_unique<Positions>(Positions{holder, slot->Only(), {entry}});
+            auto box = std::make_unique<Positions>(holder, slot->Only());
+            box->Append(entry);
             slot->SetBox(box.release());
         }
     } else {
         // An entry that cannot be packed (never seen on the platforms we build for) is
         // kept in a box of its own.
-        auto box = Slot::Packs(entry) ? nullptr
-                                      : std::make_unique<Positions>(Positions{holder, entry, {}});
+        auto box = Slot::Packs(entry) ? nullptr : std::make_unique<Positions>(holder, entry);
         Slot& added = m_index.Add(holder);
         if (box) {
             added.SetBox(box.release());
@@ -234,15 +216,9 @@ void Record::UnselectNewest() {
         m_index.Erase(slot);
     } else {
         Positions* at = slot->Box();
-        if (!at->more.empty()) {
-            EraseEntry(at->more.back());
-            at->more.pop_back();
-        } else {
-            EraseEntry(at->first);
-            at->first = Entry();
-            if (!at->Normalize()) {
-                Forget(slot);
-            }
+        EraseEntry(at->Newest());
+        if (!at->DropNewest()) {
+            Forget(slot);
         }
     }
     holder->SetSelected(false);
@@ -327,7 +303,8 @@ void Record::Unselect(VnI::IPropertyHolder* holder) {
             allTaken = true;
         }
     });
-    if (!at->Normalize()) {
+    // Keeps the oldest entry still in use in front.
+    if (!at->DropOldestWhile([](const Entry& e) { return !e.Used(); })) {
         Forget(slot);
     }
 }

@@ -14,6 +14,7 @@
 #include <algorithm>
 #include <cstring>
 #include <memory>
+#include <optional>
 
 namespace Vn::Eng {
 
@@ -62,6 +63,92 @@ Port::StringBase<char> CannotReadText(int status, const char* ngdFile) {
         break;
     }
     return text;
+}
+
+// The three texts a stub carries, as read from an NGD.
+struct NgdIdentity {
+    Port::StringBase<char> designName;
+    Port::StringBase<char> partName;
+    Port::StringBase<char> blockName;
+};
+
+// The file checks before anything is read: CanRead's verdict, then the integrity test on
+// a scratch model that lives only for the test. False after reporting the refusal.
+bool NgdFileIsReadable(const Port::StringBase<char>& ngdFile) {
+    const Nhlp_FileConv::FileStatus status = Nhlp_FileConv::CanRead(ngdFile.c_str());
+    if (status != Nhlp_FileConv::FILE_READABLE) {
+        const Port::StringBase<char> text = CannotReadText(status, ngdFile.c_str());
+        ErrorAt(kLineCannotRead).issueError("%s", text.c_str());
+        return false;
+    }
+    Nmod_Model scratch("TEST", "VAROSTE", "1.0", false);
+    if (!Nmod_Model::IsQdbReadable(ngdFile.c_str())) {
+        ErrorAt(kLineNotQdbReadable)
+            .issueError("The ngd file \"%s\" is not QDB readable\n", ngdFile.c_str());
+        return false;
+    }
+    return true;
+}
+
+// The only design of a model read from `ngdFile`; null after reporting why there is none
+// or more than one.
+Nmod_Design* OnlyDesign(Nmod_Model& model, const Port::StringBase<char>& ngdFile) {
+    Nmod_DesignMgr* designs = model.GetDesignMgr();
+    const unsigned int numDesigns = designs != nullptr ? designs->GetNumDesigns() : 0;
+    if (numDesigns > 1) {
+        ErrorAt(kLineMoreThanOneDesign)
+            .issueError("The ngd file \"%s\" contains more than one design\n", ngdFile.c_str());
+        return nullptr;
+    }
+    Nmod_Iterator<Nmod_Design*> designItr;
+    if (designs != nullptr) {
+        designItr = designs->GetDesignItr();
+        designItr.First();
+    }
+    Nmod_Design* design = designItr.Current();
+    if (numDesigns == 0 || design == nullptr) {
+        ErrorAt(kLineNoDesign)
+            .issueError("The ngd file \"%s\" does not contain a design\n", ngdFile.c_str());
+        return nullptr;
+    }
+    return design;
+}
+
+// Design, part and root block names, in that order, each refusal reported as it is met.
+// The part annotation is made in the caller's `partAnno`: it stays alive until the
+// whole operation returns.
+bool ReadIdentity(Nmod_Model& model, const Port::StringBase<char>& ngdFile,
+                  std::optional<Nhlp_PartAnno>& partAnno, NgdIdentity& identity) {
+    Nmod_Design* design = OnlyDesign(model, ngdFile);
+    if (design == nullptr) {
+        return false;
+    }
+    identity.designName = design->GetName();
+
+    Nmod_View* view = design->GetViewByName("EXPANDED");
+    if (view == nullptr) {
+        ErrorAt(kLineNoExpandedView)
+            .issueError("The ngd file \"%s\" does not contain an EXPANDED view\n", ngdFile.c_str());
+        return false;
+    }
+
+    const PM_PIC* part = partAnno.emplace(view).GetPmPic();
+    if (part == nullptr) {
+        ErrorAt(kLineNoPart)
+            .issueError("The ngd file \"%s\" does not name a part\n", ngdFile.c_str());
+        return false;
+    }
+    identity.partName = part->getDatabookName();
+    Port_MsgManData::debugStub("Parttype Databook format: %s\n", identity.partName.c_str());
+
+    const Nmod_Block* block = view->GetBlock();
+    if (block == nullptr) {
+        ErrorAt(kLineNoRootBlock)
+            .issueError("The ngd file \"%s\" does not contain a ROOT block\n", ngdFile.c_str());
+        return false;
+    }
+    identity.blockName = block->GetName();
+    return true;
 }
 
 } // namespace
@@ -129,20 +216,8 @@ bool Utilities::CreateNGCFromNGD(const Port::StringBase<char>& ngdFile,
         return true;
     }
 
-    const Nhlp_FileConv::FileStatus status = Nhlp_FileConv::CanRead(ngdFile.c_str());
-    if (status != Nhlp_FileConv::FILE_READABLE) {
-        const Port::StringBase<char> text = CannotReadText(status, ngdFile.c_str());
-        ErrorAt(kLineCannotRead).issueError("%s", text.c_str());
+    if (!NgdFileIsReadable(ngdFile)) {
         return false;
-    }
-
-    {
-        Nmod_Model scratch("TEST", "VAROSTE", "1.0", false);
-        if (!Nmod_Model::IsQdbReadable(ngdFile.c_str())) {
-            ErrorAt(kLineNotQdbReadable)
-                .issueError("The ngd file \"%s\" is not QDB readable\n", ngdFile.c_str());
-            return false;
-        }
     }
 
     Nmod_Model* readModel = nullptr;
@@ -156,56 +231,17 @@ bool Utilities::CreateNGCFromNGD(const Port::StringBase<char>& ngdFile,
         return false;
     }
 
-    Nmod_DesignMgr* designs = model->GetDesignMgr();
-    const unsigned int numDesigns = designs != nullptr ? designs->GetNumDesigns() : 0;
-    if (numDesigns > 1) {
-        ErrorAt(kLineMoreThanOneDesign)
-            .issueError("The ngd file \"%s\" contains more than one design\n", ngdFile.c_str());
-        return false;
-    }
-    Nmod_Iterator<Nmod_Design*> designItr;
-    if (designs != nullptr) {
-        designItr = designs->GetDesignItr();
-        designItr.First();
-    }
-    Nmod_Design* design = designItr.Current();
-    if (numDesigns == 0 || design == nullptr) {
-        ErrorAt(kLineNoDesign)
-            .issueError("The ngd file \"%s\" does not contain a design\n", ngdFile.c_str());
-        return false;
-    }
-    const Port::StringBase<char> designName = design->GetName();
-
-    Nmod_View* view = design->GetViewByName("EXPANDED");
-    if (view == nullptr) {
-        ErrorAt(kLineNoExpandedView)
-            .issueError("The ngd file \"%s\" does not contain an EXPANDED view\n", ngdFile.c_str());
+    std::optional<Nhlp_PartAnno> partAnno;
+    NgdIdentity identity;
+    if (!ReadIdentity(*model, ngdFile, partAnno, identity)) {
         return false;
     }
 
-    Nhlp_PartAnno partAnno(view);
-    const PM_PIC* part = partAnno.GetPmPic();
-    if (part == nullptr) {
-        ErrorAt(kLineNoPart)
-            .issueError("The ngd file \"%s\" does not name a part\n", ngdFile.c_str());
-        return false;
-    }
-    const Port::StringBase<char> partName = part->getDatabookName();
-    Port_MsgManData::debugStub("Parttype Databook format: %s\n", partName.c_str());
-
-    const Nmod_Block* block = view->GetBlock();
-    if (block == nullptr) {
-        ErrorAt(kLineNoRootBlock)
-            .issueError("The ngd file \"%s\" does not contain a ROOT block\n", ngdFile.c_str());
-        return false;
-    }
-    const Port::StringBase<char> blockName = block->GetName();
-
-    if (model && transaction != nullptr) {
+    if (transaction != nullptr) {
         model->DeleteTxn();
         model->Close();
     }
-    return CreateNGC(ngcFile, designName, partName, blockName);
+    return CreateNGC(ngcFile, identity.designName, identity.partName, identity.blockName);
 }
 
 } // namespace Vn::Eng

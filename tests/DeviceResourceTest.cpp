@@ -1,3 +1,4 @@
+//===-- tests/DeviceResourceTest.cpp - resources and generic holders keep type, flags, slots -===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

@@ -1,3 +1,4 @@
+//===-- tests/FactoryTest.cpp - components load by name, once, and make objects by id -===//
 #include "CitP/Factory.h"
 #include "Port/StringBase.h"
 

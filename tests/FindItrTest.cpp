@@ -1,3 +1,4 @@
+//===-- tests/FindItrTest.cpp - the search yields exactly the holders that match --===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

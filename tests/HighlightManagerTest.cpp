@@ -1,3 +1,4 @@
+//===-- tests/HighlightManagerTest.cpp - highlights keep list, flags and index in step -===//
 #include "FakeHolders.h"
 #include "MessageCapture.h"
 #include "Slots.h"

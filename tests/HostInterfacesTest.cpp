@@ -1,4 +1,4 @@
-//===-- tests/HostInterfacesTest.cpp - the host's identifiers and slot orders --===//
+//===-- tests/HostInterfacesTest.cpp - host identifiers and slot orders are the published -===//
 //
 // The lookup and the sample host share these headers, so a mistyped identifier or a
 // reordered operation would pass every end-to-end test and still fail against the

@@ -1,5 +1,9 @@
+//===-- tests/InterfaceIdsTest.cpp - every published interface identifier is distinct -===//
+//
 // Every published interface identifier is distinct, so GetInterface never hands out one
 // interface for another.
+//
+//===------------------------------------------------------------------------------===//
 #include "VnI/Ids.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+//===-- tests/MessageTest.cpp - messages carry place and text, never obey outside text -===//
 #include "MessageCapture.h"
 
 #include "Port/MsgMan.h"

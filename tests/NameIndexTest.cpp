@@ -1,3 +1,4 @@
+//===-- tests/NameIndexTest.cpp - the name index finds every name, collisions included -===//
 #include "s/internal/NameIndex.h"
 #include "s/PropertyNameList.h"
 

@@ -1,6 +1,10 @@
+//===-- tests/PointerIndexTest.cpp - colliding and wrapping runs of addresses stay reachable -===//
+//
 // The managers' address index on its own: keys are chosen by their home slot, so runs of
 // colliding keys, and runs that wrap from the table's last slot to its first, are built
 // on purpose rather than hoped for among a million addresses.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/internal/PointerIndex.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+//===-- tests/PortRegexpTest.cpp - regexps: leftmost, linear time, ASCII case, bounded cache -===//
 #include "Port/Regexp.h"
 #include "Port/StringBase.h"
 

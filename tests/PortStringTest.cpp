@@ -1,3 +1,4 @@
+//===-- tests/PortStringTest.cpp - the port string keeps bytes; compares, finds, formats -===//
 #include "Port/Regexp.h"
 #include "Port/StringBase.h"
 

@@ -1,4 +1,4 @@
-//===-- tests/ProjFileHelperTest.cpp - finding the project's files via the host -===//
+//===-- tests/ProjFileHelperTest.cpp - the lookup finds the files; the host keeps nothing -===//
 //
 // Each test writes a project description for the sample host, points VENLOMER_PROJECT at
 // it and runs the lookup. After every lookup the host must hold nothing of the lookup's:
@@ -397,6 +397,10 @@ TEST_F(ProjectLookup, RefusesEveryKindOfMalformedLineNamingIt) {
         {"view a X\nunit a T d f no-such\n", "line 2: unknown unit option 'no-such'"},
         {"fail everything\n", "line 1: unknown step 'everything'"},
         {"counting twice\n", "line 1: counting takes prjrep or common"},
+        {"fail\n", "line 1: fail takes one step name"},
+        {"default\n", "line 1: default takes one view name"},
+        {"view a X\ndefault a\ndefault a\n", "line 3: a second default line"},
+        {"binding\n", "line 1: binding takes a view"},
         {"view a X\nbinding a b c\nview b X\n", "line 2: no view named 'c'"},
     };
     for (const auto& [text, reason] : cases) {

@@ -1,5 +1,9 @@
+//===-- tests/PropertyCompareTest.cpp - Equals and LessThan answer the table for each type -===//
+//
 // Equals and LessThan of every property type under the compare flags. Each row of the
 // tables runs as a test of its own, so a fault names the exact case it breaks.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/ColorProperty.h"
 #include "s/Property.h"
 #include "s/PropertyFactory.h"

@@ -1,3 +1,4 @@
+//===-- tests/PropertyHolderTest.cpp - holders keep each property in its name's slot -===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

@@ -1,5 +1,9 @@
+//===-- tests/PropertyNameListTest.cpp - name lists keep positions, look-ups, references -===//
+//
 // Property names, their iterator and name lists: positions, lookup, appending, clearing,
 // borrowed pointers and debug output.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

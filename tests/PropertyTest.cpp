@@ -1,5 +1,9 @@
+//===-- tests/PropertyTest.cpp - property values serve their type, count and identity -===//
+//
 // Property values, enumerations and both factories: accessors, counts, visibility,
 // interface identity, slot order and the enumeration's current-value rules.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

@@ -1,3 +1,4 @@
+//===-- tests/RefCountTest.cpp - counts are atomic; the last release destroys once -===//
 #include "CommonI/RefCountPtr.h"
 #include "CommonI/TRefCountHelper.h"
 #include "VnI/IStringContainer.h"

@@ -1,4 +1,4 @@
-//===-- tests/SafeFileTest.cpp - writing whole files, reading guarded ones ------===//
+//===-- tests/SafeFileTest.cpp - files are written whole or not at all, read safely -===//
 #include "Port/SafeFile.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+//===-- tests/SelectionManagerTest.cpp - selection files by type, descends, keeps its order -===//
 #include "FakeHolders.h"
 #include "MessageCapture.h"
 #include "Slots.h"

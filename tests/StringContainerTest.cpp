@@ -1,3 +1,4 @@
+//===-- tests/StringContainerTest.cpp - the string container keeps texts whole, in order -===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

@@ -1,5 +1,9 @@
+//===-- tests/TreeLifetimeTest.cpp - tree nodes live while someone holds them, no longer -===//
+//
 // Who keeps a tree node alive, and what a node answers once its parent, its holder or
 // its model is gone.
+//
+//===------------------------------------------------------------------------------===//
 #include "FakeHolders.h"
 
 #include "s/PropertyHolder.h"

@@ -1,3 +1,4 @@
+//===-- tests/TreeNodeTest.cpp - adding and removing children keep chain and iterators -===//
 #include "MessageCapture.h"
 #include "Slots.h"
 

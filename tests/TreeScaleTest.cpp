@@ -1,5 +1,9 @@
+//===-- tests/TreeScaleTest.cpp - a million siblings or levels need no recursion --===//
+//
 // A million siblings and a chain a million levels deep: built, walked, copied and taken
 // apart. Any recursion over the tree would overflow the stack long before the end.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/TreeDataModel.h"
 #include "s/TreeNode.h"
 

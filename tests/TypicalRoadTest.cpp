@@ -1,6 +1,10 @@
+//===-- tests/TypicalRoadTest.cpp - a host's road: build, select, highlight, find again -===//
+//
 // The road a host takes: build device resources with properties from the factory, show
 // them in a tree, select one with descent, highlight it, colour it, and find resources
 // again among the selection.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/ColorManager.h"
 #include "s/DeviceResource.h"
 #include "s/FindItr.h"

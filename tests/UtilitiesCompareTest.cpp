@@ -1,3 +1,4 @@
+//===-- tests/UtilitiesCompareTest.cpp - the name predicates are strict weak orderings -===//
 #include "s/Utilities.h"
 
 #include <gtest/gtest.h>

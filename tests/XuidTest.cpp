@@ -1,3 +1,4 @@
+//===-- tests/XuidTest.cpp - XUIDs parse GUID text, compare both halves, keep their values -===//
 #include "Port/XUID.h"
 #include "VnI/Ids.h"
 

@@ -91,13 +91,10 @@ void FindOwnDataOrRestart(char** argv) {
     if (std::getenv("VENLOMER_DATA_PATH") != nullptr) {
         return;
     }
+    const fs::path self = VnTool::ProgramFile();
+    const fs::path data = VnTool::OwnDataFolder();
     std::error_code ec;
-    fs::path self = fs::read_symlink("/proc/self/exe", ec);
-    if (ec) {
-        return;
-    }
-    fs::path data = self.parent_path().parent_path() / "share" / "venlomer";
-    if (!fs::is_regular_file(data / "rareroded.acd", ec)) {
+    if (self.empty() || !fs::is_regular_file(data / "rareroded.acd", ec)) {
         return;
     }
     setenv("VENLOMER_DATA_PATH", data.c_str(), 1);

@@ -1,4 +1,8 @@
+//===-- tests/allocation/AllocationTest.cpp - the holder's look-ups allocate nothing -===//
+//
 // What the holder's hot paths cost in allocations.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/GenericPropertyHolder.h"
 #include "s/PropertyFactory.h"
 #include "s/PropertyHolder.h"

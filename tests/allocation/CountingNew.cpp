@@ -1,5 +1,9 @@
+//===-- tests/allocation/CountingNew.cpp - counts allocations per thread, fails one on cue -===//
+//
 // The counting allocator shared by the allocation suites: every plain form of the global
 // operator new and delete is replaced, and each allocation is counted per thread.
+//
+//===------------------------------------------------------------------------------===//
 #include "CountingNew.h"
 
 #include <cstdlib>

@@ -1,5 +1,9 @@
+//===-- tests/allocation/CountingNew.h - allocation counts; a switch that fails one on cue -===//
+//
 // Allocation counts, read from the replaced global operator new of this program, and a
 // switch that makes one chosen allocation fail.
+//
+//===------------------------------------------------------------------------------===//
 #pragma once
 
 namespace VnTest {

@@ -1,7 +1,11 @@
+//===-- tests/allocation/ExceptionSafetyTest.cpp - a failed allocation changes nothing -===//
+//
 // Operations that keep two structures in step (names and their index, a manager's lists
 // and its address index, the tile-type colours and their index) run with each of their
 // allocations failing in turn; after every failure both structures must be exactly as
 // before, and later operations must still find everything at its place.
+//
+//===------------------------------------------------------------------------------===//
 #include "FakeHolders.h"
 
 #include "s/ColorManager.h"

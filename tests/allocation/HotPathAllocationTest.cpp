@@ -1,6 +1,10 @@
+//===-- tests/allocation/HotPathAllocationTest.cpp - a search's compares allocate nothing -===//
+//
 // A search compares one wanted value with the property of every holder and looks the
 // property's name up in every holder's schema: over a million holders, one allocation per
 // comparison is a million allocations. These tests count them.
+//
+//===------------------------------------------------------------------------------===//
 #include "s/PropertyFactory.h"
 #include "s/PropertyNameList.h"
 

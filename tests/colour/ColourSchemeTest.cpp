@@ -1,6 +1,10 @@
+//===-- tests/colour/ColourSchemeTest.cpp - each kind of scheme file gives its colours -===//
+//
 // Each suite expects the scheme file its ctest registration points VENLOMER_DATA_PATH at
 // (see CMakeLists.txt), and each test runs in a process of its own: the scheme is read
 // once when the library loads, and the lookups change the state they read.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 
 #include "CommonI/IRefCount.h"

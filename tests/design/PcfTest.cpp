@@ -1,4 +1,4 @@
-//===-- tests/design/PcfTest.cpp - constraint files: reading, editing, writing ---===//
+//===-- tests/design/PcfTest.cpp - constraint files read, edit and write back byte for byte -===//
 #include "Pcf.h"
 
 #include <gtest/gtest.h>

@@ -1,4 +1,4 @@
-//===-- tests/design/PinPlanTest.cpp - checks, automatic assignment, holders -----===//
+//===-- tests/design/PinPlanTest.cpp - pin checks name each mistake; assignment fills in -===//
 #include "PinPlan.h"
 #include "PortHolders.h"
 

@@ -1,4 +1,4 @@
-//===-- tests/design/PortsMemoryTest.cpp - a large netlist is streamed -----------===//
+//===-- tests/design/PortsMemoryTest.cpp - a netlist's ports cost memory for ports only -===//
 //
 // A memory bound, not a timing: the ports of a netlist of many megabytes are read in a
 // child process whose peak resident size must stay close to that of reading a tiny

@@ -1,4 +1,4 @@
-//===-- tests/design/PortsProbe.cpp - reads a netlist's ports, nothing else ------===//
+//===-- tests/design/PortsProbe.cpp - the memory test's child: reads ports, nothing else -===//
 //
 // The memory test runs this in a child so that the child's peak resident size is the
 // reader's own. Prints "<ports> <clock ports>" or the reader's error.

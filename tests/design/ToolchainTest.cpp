@@ -1,4 +1,4 @@
-//===-- tests/design/ToolchainTest.cpp - plans judged by yosys and nextpnr-ice40 -===//
+//===-- tests/design/ToolchainTest.cpp - planned pins are placed by nextpnr-ice40 -===//
 //
 // The designs in data/ are synthesized once per test program; each test plans pins with
 // the library, writes the constraint file and lets nextpnr-ice40 place the design. A

@@ -1,4 +1,4 @@
-//===-- tests/design/YosysPortsTest.cpp - the ports of a yosys netlist -----------===//
+//===-- tests/design/YosysPortsTest.cpp - top ports and clocks, named as nextpnr names them -===//
 #include "YosysPorts.h"
 
 #include <gtest/gtest.h>

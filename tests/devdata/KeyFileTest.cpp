@@ -1,3 +1,4 @@
+//===-- tests/devdata/KeyFileTest.cpp - key files read exactly, or rejected whole by line -===//
 #include "MessageCapture.h"
 #include "TempFiles.h"
 

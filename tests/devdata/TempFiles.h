@@ -1,4 +1,4 @@
-//===-- tests/devdata/TempFiles.h - scratch folders, environment and cwd --------===//
+//===-- tests/devdata/TempFiles.h - scratch folders, environment and cwd, undone at exit -===//
 #pragma once
 
 #include <cstdlib>

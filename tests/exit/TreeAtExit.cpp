@@ -1,3 +1,5 @@
+//===-- tests/exit/TreeAtExit.cpp - a deep tree left in a static dies at exit, no overflow -===//
+//
 // A host keeps trees where they outlive its own code: a view registry in a static, a
 // per-thread view in a thread_local. This program leaves a deep, bushy tree in one of
 // those and ends; the tree is taken apart during static destruction or thread exit.
@@ -8,6 +10,8 @@
 //   venlomer_tree_at_exit static        the tree in a static, torn down after main
 //   venlomer_tree_at_exit thread-local  the tree in a thread_local made before that
 //                                       thread's first teardown, torn down at its exit
+//
+//===------------------------------------------------------------------------------===//
 #include "s/TreeNode.h"
 
 #include <atomic>

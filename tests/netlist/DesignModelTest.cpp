@@ -1,5 +1,9 @@
+//===-- tests/netlist/DesignModelTest.cpp - netlist files told apart, read, written whole -===//
+//
 // The design-model library: telling netlist files apart, reading them back, and writing
 // them all or nothing.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 #include "NetlistFiles.h"
 #include "Slots.h"
@@ -525,6 +529,35 @@ TEST_F(NetlistFiles, ANameHoldingANulByteIsRefusedNotCut) {
         WriteNetlist(path, {GoodDesign()});
         // Without STRICT checks on, the engine keeps the NUL inside the text.
         ExecSql(path, change);
+        ExpectRefusedAsFormat(path, refusal);
+    }
+}
+
+TEST_F(NetlistFiles, ARowWhoseParentIsNotInTheFileIsRefused) {
+    // A file written by another program may link a row to an owner it does not hold; each
+    // kind of row is refused by name rather than filed under a guess or dropped. Other
+    // rows of the same file point at their owner correctly, so only the dangling link is
+    // to blame.
+    const std::pair<const char*, const char*> cases[] = {
+        {"INSERT INTO nmod_view VALUES (2, 7, 'SOURCE')", "a view of a design it does not hold"},
+        {"INSERT INTO nmod_view_property VALUES (7, 'X', 'y')",
+         "a property of a view it does not hold"},
+        {"UPDATE nmod_block SET view_id = 7", "a block of a view it does not hold"},
+    };
+    int serial = 0;
+    for (const auto& [change, refusal] : cases) {
+        SCOPED_TRACE(change);
+        const std::string path = PathOf("orphan" + std::to_string(serial++) + ".ngd");
+        ExecSql(path, VnTest::kOutsideSchema);
+        ExecSql(path, (std::string("INSERT INTO nmod_format VALUES (1, 'NGD', ") +
+                       std::to_string(Nmod_Model::kFormatVersion) +
+                       ", 'm', 't', 'v');"
+                       "INSERT INTO nmod_design VALUES (1, 'D');"
+                       "INSERT INTO nmod_view VALUES (1, 1, 'EXPANDED');"
+                       "INSERT INTO nmod_view_property VALUES (1, 'PART', 'P');"
+                       "INSERT INTO nmod_block VALUES (1, 1, 'B', 0);" +
+                       change)
+                          .c_str());
         ExpectRefusedAsFormat(path, refusal);
     }
 }

@@ -1,4 +1,4 @@
-//===-- tests/netlist/NetlistFiles.h - netlist files for the tests --------------===//
+//===-- tests/netlist/NetlistFiles.h - netlist files as our writer and others write them -===//
 #pragma once
 
 #include "designmodel/Nhlp_FileConv.h"

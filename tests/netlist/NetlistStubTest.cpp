@@ -1,4 +1,8 @@
+//===-- tests/netlist/NetlistStubTest.cpp - stubs from texts or an NGD; refusals named -===//
+//
 // Netlist stubs made by the library's utilities, from four texts or from an NGD file.
+//
+//===------------------------------------------------------------------------------===//
 #include "MessageCapture.h"
 #include "NetlistFiles.h"
 

@@ -1,4 +1,4 @@
-//===-- tests/support/FakeHolders.h - minimal holders, resources and tree nodes -===//
+//===-- tests/support/FakeHolders.h - minimal holders and tree nodes that count references -===//
 //
 // Implementations of the published interfaces with nothing but the state the managers
 // touch, so the managers can be tested on their own. Fake nodes count their references

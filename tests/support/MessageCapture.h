@@ -1,4 +1,4 @@
-//===-- tests/support/MessageCapture.h - collect messages while in scope --------===//
+//===-- tests/support/MessageCapture.h - collects the library's messages while in scope -===//
 #pragma once
 
 #include "Port/MsgMan.h"

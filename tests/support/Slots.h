@@ -1,4 +1,4 @@
-//===-- tests/support/Slots.h - virtual slot numbers from the compiler ----------===//
+//===-- tests/support/Slots.h - virtual slot numbers from the compiler, for the contract -===//
 //
 // Under the Itanium C++ ABI a pointer to a virtual member function holds 1 + the byte
 // offset of its slot in the vtable. A virtual destructor takes two slots (complete and

@@ -1,4 +1,4 @@
-//===-- tests/support/SlowComponent.cpp - components with a slow or failing init ===//
+//===-- tests/support/SlowComponent.cpp - components with a slow or failing init --===//
 //
 // Built twice. venlomer_test_slow_component takes a while to initialise, so that other
 // threads load it while its init runs. venlomer_test_flaky_component (FLAKY_INIT) fails

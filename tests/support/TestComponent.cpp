@@ -1,4 +1,4 @@
-//===-- tests/support/TestComponent.cpp - a component the factory tests load ----===//
+//===-- tests/support/TestComponent.cpp - a component the factory tests load by name -===//
 //
 // Registers one counted class under kTestClassId. Its objects count how many of them are
 // alive, so tests can see creation and destruction through the factory.

@@ -1,4 +1,4 @@
-//===-- tests/tool/ArgsTest.cpp - option parsing and SVG text of the tool -------===//
+//===-- tests/tool/ArgsTest.cpp - options parse in any order; outside text escaped in SVG -===//
 #include "Args.h"
 #include "Svg.h"
 

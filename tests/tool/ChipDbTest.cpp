@@ -1,4 +1,4 @@
-//===-- tests/tool/ChipDbTest.cpp - the chip-database reader --------------------===//
+//===-- tests/tool/ChipDbTest.cpp - chip databases read whole into tiles and pins, or refused -===//
 //
 // Counts are checked against counts taken from the file by a separate, naive scan, so
 // that a reader that drops or doubles sections cannot agree with itself.

@@ -1,4 +1,4 @@
-//===-- tests/tool/FileSafetyProcessTest.cpp - venlomer's files under attack ----===//
+//===-- tests/tool/FileSafetyProcessTest.cpp - venlomer's files survive links and kills -===//
 //
 // The built tool, run as a user would run it in a shared folder: planted links, outputs
 // that are inputs, special files, concurrent runs, kills in the middle of a write, and

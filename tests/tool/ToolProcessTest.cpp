@@ -1,4 +1,4 @@
-//===-- tests/tool/ToolProcessTest.cpp - venlomer run as a program --------------===//
+//===-- tests/tool/ToolProcessTest.cpp - venlomer prints, draws and refuses as documented -===//
 //
 // Each test runs the built tool in a scratch folder of its own and judges what a user
 // sees: the exit status, the lines on stdout and stderr, and the picture, which is parsed

@@ -1,6 +1,8 @@
 //===-- tools/device/DeviceOptions.cpp - which chip database a command opens ------===//
 #include "DeviceOptions.h"
 
+#include "Port/SearchPath.h"
+
 #include <cstdlib>
 #include <filesystem>
 #include <system_error>
@@ -97,28 +99,27 @@ DeviceResolution ResolveDevice(const DeviceRequest& request, DeviceSource& sourc
     return DeviceResolution::Ok;
 }
 
+std::filesystem::path ProgramFile() {
+    std::error_code ec;
+    fs::path self = fs::read_symlink("/proc/self/exe", ec);
+    return ec ? fs::path() : self;
+}
+
+std::filesystem::path OwnDataFolder() {
+    const fs::path self = ProgramFile();
+    return self.empty() ? self : self.parent_path().parent_path() / "share" / "venlomer";
+}
+
 std::string FindDataFile(const std::string& name) {
     std::error_code ec;
-    if (const char* path = std::getenv("VENLOMER_DATA_PATH")) {
-        std::string folders(path);
-        std::size_t start = 0;
-        while (start <= folders.size()) {
-            std::size_t end = folders.find(':', start);
-            if (end == std::string::npos) {
-                end = folders.size();
-            }
-            if (end > start) {
-                fs::path candidate = fs::path(folders.substr(start, end - start)) / name;
-                if (fs::is_regular_file(candidate, ec)) {
-                    return candidate.string();
-                }
-            }
-            start = end + 1;
+    for (const std::string& folder : Port::SearchPathFromEnv("VENLOMER_DATA_PATH")) {
+        fs::path candidate = fs::path(folder) / name;
+        if (fs::is_regular_file(candidate, ec)) {
+            return candidate.string();
         }
     }
-    fs::path self = fs::read_symlink("/proc/self/exe", ec);
-    if (!ec) {
-        fs::path candidate = self.parent_path().parent_path() / "share" / "venlomer" / name;
+    if (const fs::path own = OwnDataFolder(); !own.empty()) {
+        fs::path candidate = own / name;
         if (fs::is_regular_file(candidate, ec)) {
             return candidate.string();
         }

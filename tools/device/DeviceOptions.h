@@ -21,6 +21,7 @@
 //===------------------------------------------------------------------------------===//
 #pragma once
 
+#include <filesystem>
 #include <string>
 
 namespace VnTool {
@@ -59,5 +60,11 @@ DeviceResolution ResolveDevice(const DeviceRequest& request, DeviceSource& sourc
 /// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
 /// then in share/venlomer beside the program's bin folder. Empty when not found.
 std::string FindDataFile(const std::string& name);
+
+/// This program's own file; empty when the system does not say.
+std::filesystem::path ProgramFile();
+/// The data folder that comes with this program, <program>/../share/venlomer, in a build
+/// tree and an installed tree alike; empty when the program's file is not known.
+std::filesystem::path OwnDataFolder();
 
 } // namespace VnTool

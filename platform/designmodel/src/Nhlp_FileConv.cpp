@@ -13,6 +13,7 @@
 #include <climits>
 #include <cstring>
 #include <fcntl.h>
+#include <memory>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <unordered_map>
@@ -95,6 +96,168 @@ std::string OwnedKey(long long owner, const std::string& name) {
     return key + name;
 }
 
+// Where a file is read from, and what its refusals say.
+struct Source {
+    const Nmod_Detail::Connection& db;
+    const std::string& file;
+    const std::string& context;
+};
+
+template <class Parent> using RowsById = std::unordered_map<long long, Parent*>;
+
+// The object a row hangs under; a row whose parent id names no row read before is
+// refused with `orphan` ("a view of a design"), as the file then holds a dangling link.
+template <class Parent>
+Parent& ParentRow(const RowsById<Parent>& parents, long long id, const char* orphan,
+                  const std::string& file) {
+    const auto found = parents.find(id);
+    if (found == parents.end()) {
+        Refuse(file, std::string(orphan) + " it does not hold");
+    }
+    return *found->second;
+}
+
+// The format record: which kind of database and which version, and the model's names.
+std::unique_ptr<Nmod_Model> ReadFormat(const Source& from) {
+    const std::string& file = from.file;
+    Statement format(from.db,
+                     "SELECT kind, version, model_name, tool, tool_version FROM nmod_format "
+                     "WHERE id = 1",
+                     from.context);
+    if (!format.Step()) {
+        throw Nmod_Exception::Format("netlist database \"" + file + "\" has no format record");
+    }
+    const std::string kind = TextColumn(format, 0, "format kind", file);
+    if (kind != Nmod_Detail::kKindNgd && kind != Nmod_Detail::kKindNgc) {
+        throw Nmod_Exception::Format("\"" + file + "\" is not a netlist database (kind \"" + kind +
+                                     "\")");
+    }
+    const long long version = IntColumn(format, 1, "format version", file);
+    if (version != Nmod_Model::kFormatVersion) {
+        throw Nmod_Exception::Format("netlist database \"" + file + "\" has format version " +
+                                     std::to_string(version) + "; this library reads version " +
+                                     std::to_string(Nmod_Model::kFormatVersion));
+    }
+    return Nmod_Detail::Access::NewReadModel(
+        TextColumn(format, 2, "model name", file), TextColumn(format, 3, "tool name", file),
+        TextColumn(format, 4, "tool version", file), file, kind == Nmod_Detail::kKindNgd);
+}
+
+// Duplicates are found through hash sets: a file of many designs, views or properties
+// is read in time proportional to its size.
+
+RowsById<Nmod_Design> ReadDesigns(const Source& from, Nmod_Model& model) {
+    RowsById<Nmod_Design> designs;
+    std::unordered_set<std::string> names;
+    Statement rows(from.db, "SELECT id, name FROM nmod_design ORDER BY id", from.context);
+    while (rows.Step()) {
+        const long long id = IntColumn(rows, 0, "design id", from.file);
+        std::string name = TextColumn(rows, 1, "design name", from.file);
+        if (!names.insert(name).second) {
+            Refuse(from.file, "design \"" + name + "\" twice");
+        }
+        designs[id] = Nmod_Detail::Access::AddDesign(model, id, std::move(name));
+    }
+    return designs;
+}
+
+RowsById<Nmod_View> ReadViews(const Source& from, const RowsById<Nmod_Design>& designs) {
+    RowsById<Nmod_View> views;
+    std::unordered_set<std::string> names;
+    Statement rows(from.db, "SELECT id, design_id, name FROM nmod_view ORDER BY id", from.context);
+    while (rows.Step()) {
+        const long long id = IntColumn(rows, 0, "view id", from.file);
+        const long long designId = IntColumn(rows, 1, "view's design", from.file);
+        Nmod_Design& design = ParentRow(designs, designId, "a view of a design", from.file);
+        std::string name = TextColumn(rows, 2, "view name", from.file);
+        if (!names.insert(OwnedKey(designId, name)).second) {
+            Refuse(from.file, "view \"" + name + "\" of design \"" + design.GetName() + "\" twice");
+        }
+        views[id] = Nmod_Detail::Access::AddView(design, id, std::move(name));
+    }
+    return views;
+}
+
+void ReadProperties(const Source& from, const RowsById<Nmod_View>& views) {
+    std::unordered_set<std::string> names;
+    Statement rows(from.db, "SELECT view_id, name, value FROM nmod_view_property ORDER BY rowid",
+                   from.context);
+    while (rows.Step()) {
+        const long long viewId = IntColumn(rows, 0, "property's view", from.file);
+        Nmod_View& view = ParentRow(views, viewId, "a property of a view", from.file);
+        std::string name = TextColumn(rows, 1, "property name", from.file);
+        std::string value = TextColumn(rows, 2, "property value", from.file);
+        if (!names.insert(OwnedKey(viewId, name)).second) {
+            Refuse(from.file, "property \"" + name + "\" of view \"" + view.GetName() + "\" twice");
+        }
+        Nmod_Detail::Access::AddProperty(view, std::move(name), std::move(value));
+    }
+}
+
+void ReadBlocks(const Source& from, const RowsById<Nmod_View>& views) {
+    Statement rows(from.db, "SELECT view_id, name, type FROM nmod_block ORDER BY id", from.context);
+    while (rows.Step()) {
+        Nmod_View& view = ParentRow(views, IntColumn(rows, 0, "block's view", from.file),
+                                    "a block of a view", from.file);
+        std::string name = TextColumn(rows, 1, "block name", from.file);
+        const long long type = IntColumn(rows, 2, "block type", from.file);
+        if (type < 0 || type > static_cast<long long>(UINT_MAX)) {
+            Refuse(from.file, "block \"" + name + "\" of a type out of range");
+        }
+        Nmod_Detail::Access::AddBlock(view, std::move(name), static_cast<unsigned int>(type));
+    }
+}
+
+// What the engine says of a file that starts like one of its databases: the tables a
+// netlist database has, and the kind and version of its format record.
+Nhlp_FileConv::FileStatus StatusOfDatabase(const char* fileName) {
+    try {
+        const auto db = Nmod_Detail::Connection::OpenForReading(fileName);
+        Statement tables(db,
+                         "SELECT count(*) FROM sqlite_master WHERE type = 'table' AND name IN "
+                         "(?, ?, ?, ?, ?)",
+                         "tables");
+        int index = 1;
+        for (const char* table : Nmod_Detail::kTables) {
+            tables.Bind(index++, std::string(table));
+        }
+        if (!tables.Step() ||
+            tables.Int(0) != static_cast<long long>(std::size(Nmod_Detail::kTables))) {
+            return Nhlp_FileConv::FILE_NOT_NGD;
+        }
+        Statement format(db, "SELECT kind, version FROM nmod_format WHERE id = 1", "format");
+        if (!format.Step() || format.Type(0) != SQLITE_TEXT || format.Type(1) != SQLITE_INTEGER ||
+            format.Text(0) != std::string(Nmod_Detail::kKindNgd)) {
+            return Nhlp_FileConv::FILE_NOT_NGD;
+        }
+        const long long version = format.Int(1);
+        if (version < Nmod_Model::kFormatVersion) {
+            return Nhlp_FileConv::FILE_OBSOLETE;
+        }
+        return version == Nmod_Model::kFormatVersion ? Nhlp_FileConv::FILE_READABLE
+                                                     : Nhlp_FileConv::FILE_NOT_NGD;
+    } catch (const Nmod_Exception::Format&) {
+        // Unfinished changes beside the file: as it stands it is no complete NGD.
+        return Nhlp_FileConv::FILE_NOT_NGD;
+    } catch (const Nmod_Exception::Database& e) {
+        switch (e.GetCode()) {
+        case SQLITE_NOTADB:
+        case SQLITE_CORRUPT:
+        case SQLITE_ERROR:
+        case SQLITE_MISMATCH:
+        case SQLITE_FORMAT:
+            return Nhlp_FileConv::FILE_NOT_NGD;
+        case SQLITE_PERM:
+        case SQLITE_AUTH:
+            return Nhlp_FileConv::FILE_NO_READ_PERMISSION;
+        default:
+            return Nhlp_FileConv::FILE_UNKNOWN_ERROR;
+        }
+    } catch (...) {
+        return Nhlp_FileConv::FILE_UNKNOWN_ERROR;
+    }
+}
+
 } // namespace
 
 Nhlp_FileConv::FileStatus Nhlp_FileConv::CanRead(const char* fileName) {
@@ -117,50 +280,7 @@ Nhlp_FileConv::FileStatus Nhlp_FileConv::CanRead(const char* fileName) {
     if (!sqlite) {
         return FILE_NOT_NGD;
     }
-    try {
-        const auto db = Nmod_Detail::Connection::OpenForReading(fileName);
-        Statement tables(db,
-                         "SELECT count(*) FROM sqlite_master WHERE type = 'table' AND name IN "
-                         "(?, ?, ?, ?, ?)",
-                         "tables");
-        int index = 1;
-        for (const char* table : Nmod_Detail::kTables) {
-            tables.Bind(index++, std::string(table));
-        }
-        if (!tables.Step() ||
-            tables.Int(0) != static_cast<long long>(std::size(Nmod_Detail::kTables))) {
-            return FILE_NOT_NGD;
-        }
-        Statement format(db, "SELECT kind, version FROM nmod_format WHERE id = 1", "format");
-        if (!format.Step() || format.Type(0) != SQLITE_TEXT || format.Type(1) != SQLITE_INTEGER ||
-            format.Text(0) != std::string(Nmod_Detail::kKindNgd)) {
-            return FILE_NOT_NGD;
-        }
-        const long long version = format.Int(1);
-        if (version < Nmod_Model::kFormatVersion) {
-            return FILE_OBSOLETE;
-        }
-        return version == Nmod_Model::kFormatVersion ? FILE_READABLE : FILE_NOT_NGD;
-    } catch (const Nmod_Exception::Format&) {
-        // Unfinished changes beside the file: as it stands it is no complete NGD.
-        return FILE_NOT_NGD;
-    } catch (const Nmod_Exception::Database& e) {
-        switch (e.GetCode()) {
-        case SQLITE_NOTADB:
-        case SQLITE_CORRUPT:
-        case SQLITE_ERROR:
-        case SQLITE_MISMATCH:
-        case SQLITE_FORMAT:
-            return FILE_NOT_NGD;
-        case SQLITE_PERM:
-        case SQLITE_AUTH:
-            return FILE_NO_READ_PERMISSION;
-        default:
-            return FILE_UNKNOWN_ERROR;
-        }
-    } catch (...) {
-        return FILE_UNKNOWN_ERROR;
-    }
+    return StatusOfDatabase(fileName);
 }
 
 void Nhlp_FileConv::ReadAsNmod(const char* fileName, Nmod_Model*& model, Nmod_Txn*& txn,
@@ -174,93 +294,12 @@ void Nhlp_FileConv::ReadAsNmod(const char* fileName, Nmod_Model*& model, Nmod_Tx
     }
     const auto db = Nmod_Detail::Connection::OpenForReading(file);
     const std::string context = "cannot read netlist database \"" + file + "\"";
+    const Source from{db, file, context};
 
-    Statement format(db,
-                     "SELECT kind, version, model_name, tool, tool_version FROM nmod_format "
-                     "WHERE id = 1",
-                     context);
-    if (!format.Step()) {
-        throw Nmod_Exception::Format("netlist database \"" + file + "\" has no format record");
-    }
-    const std::string kind = TextColumn(format, 0, "format kind", file);
-    if (kind != Nmod_Detail::kKindNgd && kind != Nmod_Detail::kKindNgc) {
-        throw Nmod_Exception::Format("\"" + file + "\" is not a netlist database (kind \"" + kind +
-                                     "\")");
-    }
-    const long long version = IntColumn(format, 1, "format version", file);
-    if (version != Nmod_Model::kFormatVersion) {
-        throw Nmod_Exception::Format("netlist database \"" + file + "\" has format version " +
-                                     std::to_string(version) + "; this library reads version " +
-                                     std::to_string(Nmod_Model::kFormatVersion));
-    }
-    auto read = Nmod_Detail::Access::NewReadModel(
-        TextColumn(format, 2, "model name", file), TextColumn(format, 3, "tool name", file),
-        TextColumn(format, 4, "tool version", file), file, kind == Nmod_Detail::kKindNgd);
-
-    // Duplicates are found through hash sets: a file of many designs, views or properties
-    // is read in time proportional to its size.
-    std::unordered_map<long long, Nmod_Design*> designs;
-    std::unordered_set<std::string> designNames;
-    Statement designRows(db, "SELECT id, name FROM nmod_design ORDER BY id", context);
-    while (designRows.Step()) {
-        const long long id = IntColumn(designRows, 0, "design id", file);
-        std::string name = TextColumn(designRows, 1, "design name", file);
-        if (!designNames.insert(name).second) {
-            Refuse(file, "design \"" + name + "\" twice");
-        }
-        designs[id] = Nmod_Detail::Access::AddDesign(*read, id, std::move(name));
-    }
-
-    std::unordered_map<long long, Nmod_View*> views;
-    std::unordered_set<std::string> viewNames;
-    Statement viewRows(db, "SELECT id, design_id, name FROM nmod_view ORDER BY id", context);
-    while (viewRows.Step()) {
-        const long long id = IntColumn(viewRows, 0, "view id", file);
-        const long long designId = IntColumn(viewRows, 1, "view's design", file);
-        const auto design = designs.find(designId);
-        if (design == designs.end()) {
-            Refuse(file, "a view of a design it does not hold");
-        }
-        std::string name = TextColumn(viewRows, 2, "view name", file);
-        if (!viewNames.insert(OwnedKey(designId, name)).second) {
-            Refuse(file,
-                   "view \"" + name + "\" of design \"" + design->second->GetName() + "\" twice");
-        }
-        views[id] = Nmod_Detail::Access::AddView(*design->second, id, std::move(name));
-    }
-
-    std::unordered_set<std::string> propertyNames;
-    Statement propertyRows(db, "SELECT view_id, name, value FROM nmod_view_property ORDER BY rowid",
-                           context);
-    while (propertyRows.Step()) {
-        const long long viewId = IntColumn(propertyRows, 0, "property's view", file);
-        const auto view = views.find(viewId);
-        if (view == views.end()) {
-            Refuse(file, "a property of a view it does not hold");
-        }
-        std::string name = TextColumn(propertyRows, 1, "property name", file);
-        std::string value = TextColumn(propertyRows, 2, "property value", file);
-        if (!propertyNames.insert(OwnedKey(viewId, name)).second) {
-            Refuse(file,
-                   "property \"" + name + "\" of view \"" + view->second->GetName() + "\" twice");
-        }
-        Nmod_Detail::Access::AddProperty(*view->second, std::move(name), std::move(value));
-    }
-
-    Statement blockRows(db, "SELECT view_id, name, type FROM nmod_block ORDER BY id", context);
-    while (blockRows.Step()) {
-        const auto view = views.find(IntColumn(blockRows, 0, "block's view", file));
-        if (view == views.end()) {
-            Refuse(file, "a block of a view it does not hold");
-        }
-        std::string name = TextColumn(blockRows, 1, "block name", file);
-        const long long type = IntColumn(blockRows, 2, "block type", file);
-        if (type < 0 || type > static_cast<long long>(UINT_MAX)) {
-            Refuse(file, "block \"" + name + "\" of a type out of range");
-        }
-        Nmod_Detail::Access::AddBlock(*view->second, std::move(name),
-                                      static_cast<unsigned int>(type));
-    }
+    auto read = ReadFormat(from);
+    const RowsById<Nmod_View> views = ReadViews(from, ReadDesigns(from, *read));
+    ReadProperties(from, views);
+    ReadBlocks(from, views);
 
     Nmod_Detail::Access::OpenReadTxn(*read);
     // Nothing can fail from here on: hand out both or neither.

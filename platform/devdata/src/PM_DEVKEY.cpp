@@ -5,6 +5,7 @@
 
 #include "Port/MsgMan.h"
 #include "Port/SafeFile.h"
+#include "Port/SearchPath.h"
 
 #include <algorithm>
 #include <climits>
@@ -98,74 +99,100 @@ short ClampShort(std::size_t n) {
     return n > SHRT_MAX ? SHRT_MAX : static_cast<short>(n);
 }
 
+// A position in one line of a key file.
+struct LineCursor {
+    std::string_view line;
+    std::size_t p = 0;
+
+    bool AtEnd() const { return p == line.size(); }
+    char Peek() const { return line[p]; }
+    void SkipBlanks() {
+        while (p < line.size() && IsBlank(line[p])) {
+            ++p;
+        }
+    }
+};
+
+// "KEY =" at the cursor, which is then past the equals sign.
+bool ReadKey(LineCursor& at, std::string& key, std::string& reason) {
+    const std::size_t keyBegin = at.p;
+    while (!at.AtEnd() && IsKeyChar(at.Peek())) {
+        ++at.p;
+    }
+    const std::size_t keyEnd = at.p;
+    at.SkipBlanks();
+    if (keyEnd == keyBegin || at.AtEnd() || at.Peek() != '=') {
+        reason = "expected KEY = value";
+        return false;
+    }
+    ++at.p;
+    key.assign(at.line.substr(keyBegin, keyEnd - keyBegin));
+    return true;
+}
+
+// One signed 32-bit decimal integer at the cursor. Digits are added up in 64 bits and
+// checked at each step, so no run of digits can overflow on the way.
+bool ReadInteger(LineCursor& at, std::int32_t& number, std::string& reason) {
+    const bool negative = !at.AtEnd() && at.Peek() == '-';
+    if (negative) {
+        ++at.p;
+    }
+    if (at.AtEnd() || !IsDigit(at.Peek())) {
+        reason = "a field is not an integer";
+        return false;
+    }
+    std::int64_t magnitude = 0;
+    while (!at.AtEnd() && IsDigit(at.Peek())) {
+        magnitude = magnitude * 10 + (at.Peek() - '0');
+        if (magnitude > std::int64_t{INT32_MAX} + 1) {
+            reason = "an integer lies outside the signed 32-bit range";
+            return false;
+        }
+        ++at.p;
+    }
+    if (!negative && magnitude > INT32_MAX) {
+        reason = "an integer lies outside the signed 32-bit range";
+        return false;
+    }
+    number = static_cast<std::int32_t>(negative ? -magnitude : magnitude);
+    return true;
+}
+
 // Parses one line. Answers true for a line that holds nothing, or a key and its value
 // (then `key` is not empty); false with `reason` set for anything else.
 bool ParseLine(std::string_view line, std::string& key, Value& value, std::string& reason) {
     if (const auto hash = line.find('#'); hash != std::string_view::npos) {
         line = line.substr(0, hash);
     }
-    std::size_t p = 0;
-    const std::size_t n = line.size();
-    auto skipBlanks = [&] {
-        while (p < n && IsBlank(line[p])) {
-            ++p;
-        }
-    };
-    skipBlanks();
-    if (p == n) {
+    LineCursor at{line};
+    at.SkipBlanks();
+    if (at.AtEnd()) {
         return true;
     }
-    const std::size_t keyBegin = p;
-    while (p < n && IsKeyChar(line[p])) {
-        ++p;
-    }
-    const std::size_t keyEnd = p;
-    skipBlanks();
-    if (keyEnd == keyBegin || p == n || line[p] != '=') {
-        reason = "expected KEY = value";
+    if (!ReadKey(at, key, reason)) {
         return false;
     }
-    ++p;
-    key.assign(line.substr(keyBegin, keyEnd - keyBegin));
-
-    skipBlanks();
-    if (p == n) {
+    at.SkipBlanks();
+    if (at.AtEnd()) {
         return true; // an empty value: a key with no entries
     }
     for (;;) {
-        const bool negative = p < n && line[p] == '-';
-        if (negative) {
-            ++p;
-        }
-        if (p == n || !IsDigit(line[p])) {
-            reason = "a field is not an integer";
+        std::int32_t number = 0;
+        if (!ReadInteger(at, number, reason)) {
             return false;
         }
-        std::int64_t magnitude = 0;
-        while (p < n && IsDigit(line[p])) {
-            magnitude = magnitude * 10 + (line[p] - '0');
-            if (magnitude > std::int64_t{INT32_MAX} + 1) {
-                reason = "an integer lies outside the signed 32-bit range";
-                return false;
-            }
-            ++p;
-        }
-        if (!negative && magnitude > INT32_MAX) {
-            reason = "an integer lies outside the signed 32-bit range";
-            return false;
-        }
-        value.numbers.push_back(static_cast<std::int32_t>(negative ? -magnitude : magnitude));
-        skipBlanks();
-        if (p == n) {
+        value.numbers.push_back(number);
+        at.SkipBlanks();
+        if (at.AtEnd()) {
             return true;
         }
-        if (kSeparators.find(line[p]) == std::string_view::npos) {
+        if (kSeparators.find(at.Peek()) == std::string_view::npos) {
             reason = "a field is not an integer";
             return false;
         }
-        value.separators.push_back(line[p]);
-        ++p;
-        skipBlanks();
+        value.separators.push_back(at.Peek());
+        ++at.p;
+        at.SkipBlanks();
     }
 }
 
@@ -205,16 +232,9 @@ std::filesystem::path FindFile(const char* name, bool search) {
     if (!search || bare.find('/') != std::string_view::npos) {
         return usable(bare) ? fs::path(bare) : fs::path();
     }
-    if (const char* dataPath = std::getenv("VENLOMER_DATA_PATH")) {
-        std::string_view dirs(dataPath);
-        while (!dirs.empty()) {
-            const auto colon = dirs.find(':');
-            const std::string_view dir = dirs.substr(0, colon);
-            dirs = colon == std::string_view::npos ? std::string_view() : dirs.substr(colon + 1);
-            // An empty element would otherwise mean the filesystem root.
-            if (!dir.empty() && usable(fs::path(dir) / bare)) {
-                return fs::path(dir) / bare;
-            }
+    for (const std::string& dir : Port::SearchPathFromEnv("VENLOMER_DATA_PATH")) {
+        if (usable(fs::path(dir) / bare)) {
+            return fs::path(dir) / bare;
         }
     }
     if (usable(bare)) {

@@ -101,165 +101,238 @@ struct PendingBinding {
     std::vector<PendingName> produced;
 };
 
-} // namespace
+// The state of one reading: what is already known for sure goes into `out`; the view
+// names met on the way wait in the pending lists until every view is declared.
+class Reader {
+public:
+    Reader(Description& out, ParseError& error) : m_out(out), m_error(error) {}
 
-bool ParseDescription(std::string_view text, Description& out, ParseError& error) {
-    out = Description{};
-    std::unordered_map<std::string, std::size_t> viewIndex;
-    std::optional<PendingName> defaultView;
-    std::vector<PendingUnit> units;
-    std::vector<PendingBinding> bindings;
-    std::vector<std::string> words;
-    std::string why;
+    bool ReadLines(std::string_view text);
+    bool Resolve();
 
-    auto fail = [&error](int line, std::string what) {
-        error.line = line;
-        error.what = std::move(what);
+private:
+    using Words = std::vector<std::string>;
+    using Handler = bool (Reader::*)(const Words&);
+
+    bool Fail(int line, std::string what) {
+        m_error.line = line;
+        m_error.what = std::move(what);
         return false;
-    };
+    }
+    bool Directive(const Words& words);
 
-    int lineNo = 0;
+    // One per directive; each gets the whole line split into words (words[0] is the
+    // directive itself) and reports its own errors at the current line.
+    bool Project(const Words& words);
+    bool View(const Words& words);
+    bool Default(const Words& words);
+    bool Unit(const Words& words);
+    bool Binding(const Words& words);
+    bool Counting(const Words& words);
+    bool FailStep(const Words& words);
+
+    static constexpr std::array<std::pair<std::string_view, Handler>, 7> kDirectives = {{
+        {"project", &Reader::Project},
+        {"view", &Reader::View},
+        {"default", &Reader::Default},
+        {"unit", &Reader::Unit},
+        {"binding", &Reader::Binding},
+        {"counting", &Reader::Counting},
+        {"fail", &Reader::FailStep},
+    }};
+
+    std::size_t ResolveName(const PendingName& name);
+
+    Description& m_out;
+    ParseError& m_error;
+    int m_line = 0;
+    std::unordered_map<std::string, std::size_t> m_viewIndex;
+    std::optional<PendingName> m_defaultView;
+    std::vector<PendingUnit> m_units;
+    std::vector<PendingBinding> m_bindings;
+    std::optional<PendingName> m_unknown; // the first name that resolved to no view
+};
+
+bool Reader::ReadLines(std::string_view text) {
+    Words words;
+    std::string why;
     std::size_t pos = 0;
     while (pos < text.size()) {
         const std::size_t end = std::min(text.find('\n', pos), text.size());
         const std::string_view line = text.substr(pos, end - pos);
         pos = end + 1;
-        ++lineNo;
+        ++m_line;
 
         const std::size_t first = line.find_first_not_of(" \t\r");
         if (first == std::string_view::npos || line[first] == '#') {
             continue;
         }
         if (!SplitWords(line, words, why)) {
-            return fail(lineNo, why);
+            return Fail(m_line, why);
         }
-        const std::string& directive = words[0];
-        const std::size_t args = words.size() - 1;
-
-        if (directive == "project") {
-            if (args != 1) {
-                return fail(lineNo, "project takes one file name (\"\" for an empty one)");
-            }
-            if (out.hasProject) {
-                return fail(lineNo, "a second project line");
-            }
-            out.hasProject = true;
-            out.projectFile = words[1];
-        } else if (directive == "view") {
-            if (args < 1 || args > 3 || (args == 3 && words[3] != "second")) {
-                return fail(lineNo, "view takes a name, an optional type and `second`");
-            }
-            if (!viewIndex.emplace(words[1], out.views.size()).second) {
-                return fail(lineNo, "view '" + words[1] + "' declared twice");
-            }
-            ViewDesc view;
-            view.name = words[1];
-            view.hasType = args >= 2;
-            view.typeId = args >= 2 ? words[2] : std::string();
-            view.secondIdentity = args == 3;
-            out.views.push_back(std::move(view));
-        } else if (directive == "default") {
-            if (args != 1) {
-                return fail(lineNo, "default takes one view name");
-            }
-            if (defaultView) {
-                return fail(lineNo, "a second default line");
-            }
-            defaultView = PendingName{lineNo, words[1]};
-        } else if (directive == "unit") {
-            if (args < 4) {
-                return fail(lineNo, "unit takes a view, a type, a directory and a file");
-            }
-            PendingUnit pending{{lineNo, words[1]}, {}};
-            UnitDesc& unit = pending.unit;
-            unit.hasType = words[2] != "-";
-            unit.typeId = unit.hasType ? words[2] : std::string();
-            unit.directory = words[3];
-            unit.file = words[4];
-            for (std::size_t i = 5; i < words.size(); ++i) {
-                if (words[i] == "no-id") {
-                    unit.answersId = false;
-                } else if (words[i] == "no-file-access") {
-                    unit.fileAccess = false;
-                } else if (words[i] == "no-file") {
-                    unit.hdlFile = false;
-                } else {
-                    return fail(lineNo, "unknown unit option '" + words[i] + "'");
-                }
-            }
-            units.push_back(std::move(pending));
-        } else if (directive == "binding") {
-            if (args < 1) {
-                return fail(lineNo, "binding takes a view and the views it produces");
-            }
-            PendingBinding pending{{lineNo, words[1]}, {}};
-            for (std::size_t i = 2; i < words.size(); ++i) {
-                pending.produced.push_back({lineNo, words[i]});
-            }
-            bindings.push_back(std::move(pending));
-        } else if (directive == "counting") {
-            if (args != 1 || (words[1] != "prjrep" && words[1] != "common")) {
-                return fail(lineNo, "counting takes prjrep or common");
-            }
-            out.commonCounting = words[1] == "common";
-        } else if (directive == "fail") {
-            if (args != 1) {
-                return fail(lineNo, "fail takes one step name");
-            }
-            std::size_t step = 0;
-            while (step < kStepNames.size() && kStepNames[step] != words[1]) {
-                ++step;
-            }
-            if (step == kStepNames.size()) {
-                return fail(lineNo, "unknown step '" + words[1] + "'");
-            }
-            out.failures |= 1u << step;
-        } else {
-            return fail(lineNo, "unknown directive '" + directive + "'");
+        if (!Directive(words)) {
+            return false;
         }
-    }
-
-    // Names are resolved after the whole file is read, so that a view may be used above
-    // its declaration; the error reported is still the one of the first bad line.
-    std::optional<PendingName> unknown;
-    auto resolve = [&](const PendingName& name) -> std::size_t {
-        const auto found = viewIndex.find(name.name);
-        if (found != viewIndex.end()) {
-            return found->second;
-        }
-        if (!unknown || name.line < unknown->line) {
-            unknown = name;
-        }
-        return 0;
-    };
-    if (defaultView) {
-        out.defaultView = resolve(*defaultView);
-        out.hasDefault = true;
-    }
-    std::vector<std::size_t> unitViews;
-    unitViews.reserve(units.size());
-    for (const PendingUnit& pending : units) {
-        unitViews.push_back(resolve(pending.view));
-    }
-    std::vector<std::pair<std::size_t, std::vector<std::size_t>>> bindingViews;
-    bindingViews.reserve(bindings.size());
-    for (const PendingBinding& pending : bindings) {
-        std::vector<std::size_t> produced;
-        for (const PendingName& name : pending.produced) {
-            produced.push_back(resolve(name));
-        }
-        bindingViews.emplace_back(resolve(pending.view), std::move(produced));
-    }
-    if (unknown) {
-        return fail(unknown->line, "no view named '" + unknown->name + "'");
-    }
-    for (std::size_t i = 0; i < units.size(); ++i) {
-        out.views[unitViews[i]].units.push_back(std::move(units[i].unit));
-    }
-    for (auto& [view, produced] : bindingViews) {
-        out.views[view].bindings.push_back(std::move(produced));
     }
     return true;
+}
+
+bool Reader::Directive(const Words& words) {
+    for (const auto& [name, handler] : kDirectives) {
+        if (name == words[0]) {
+            return (this->*handler)(words);
+        }
+    }
+    return Fail(m_line, "unknown directive '" + words[0] + "'");
+}
+
+bool Reader::Project(const Words& words) {
+    if (words.size() != 2) {
+        return Fail(m_line, "project takes one file name (\"\" for an empty one)");
+    }
+    if (m_out.hasProject) {
+        return Fail(m_line, "a second project line");
+    }
+    m_out.hasProject = true;
+    m_out.projectFile = words[1];
+    return true;
+}
+
+bool Reader::View(const Words& words) {
+    const std::size_t args = words.size() - 1;
+    if (args < 1 || args > 3 || (args == 3 && words[3] != "second")) {
+        return Fail(m_line, "view takes a name, an optional type and `second`");
+    }
+    if (!m_viewIndex.emplace(words[1], m_out.views.size()).second) {
+        return Fail(m_line, "view '" + words[1] + "' declared twice");
+    }
+    ViewDesc view;
+    view.name = words[1];
+    view.hasType = args >= 2;
+    view.typeId = args >= 2 ? words[2] : std::string();
+    view.secondIdentity = args == 3;
+    m_out.views.push_back(std::move(view));
+    return true;
+}
+
+bool Reader::Default(const Words& words) {
+    if (words.size() != 2) {
+        return Fail(m_line, "default takes one view name");
+    }
+    if (m_defaultView) {
+        return Fail(m_line, "a second default line");
+    }
+    m_defaultView = PendingName{m_line, words[1]};
+    return true;
+}
+
+bool Reader::Unit(const Words& words) {
+    if (words.size() < 5) {
+        return Fail(m_line, "unit takes a view, a type, a directory and a file");
+    }
+    PendingUnit pending{{m_line, words[1]}, {}};
+    UnitDesc& unit = pending.unit;
+    unit.hasType = words[2] != "-";
+    unit.typeId = unit.hasType ? words[2] : std::string();
+    unit.directory = words[3];
+    unit.file = words[4];
+    for (std::size_t i = 5; i < words.size(); ++i) {
+        if (words[i] == "no-id") {
+            unit.answersId = false;
+        } else if (words[i] == "no-file-access") {
+            unit.fileAccess = false;
+        } else if (words[i] == "no-file") {
+            unit.hdlFile = false;
+        } else {
+            return Fail(m_line, "unknown unit option '" + words[i] + "'");
+        }
+    }
+    m_units.push_back(std::move(pending));
+    return true;
+}
+
+bool Reader::Binding(const Words& words) {
+    if (words.size() < 2) {
+        return Fail(m_line, "binding takes a view and the views it produces");
+    }
+    PendingBinding pending{{m_line, words[1]}, {}};
+    for (std::size_t i = 2; i < words.size(); ++i) {
+        pending.produced.push_back({m_line, words[i]});
+    }
+    m_bindings.push_back(std::move(pending));
+    return true;
+}
+
+bool Reader::Counting(const Words& words) {
+    if (words.size() != 2 || (words[1] != "prjrep" && words[1] != "common")) {
+        return Fail(m_line, "counting takes prjrep or common");
+    }
+    m_out.commonCounting = words[1] == "common";
+    return true;
+}
+
+bool Reader::FailStep(const Words& words) {
+    if (words.size() != 2) {
+        return Fail(m_line, "fail takes one step name");
+    }
+    const auto step = std::find(kStepNames.begin(), kStepNames.end(), words[1]);
+    if (step == kStepNames.end()) {
+        return Fail(m_line, "unknown step '" + words[1] + "'");
+    }
+    m_out.failures |= 1u << static_cast<unsigned>(step - kStepNames.begin());
+    return true;
+}
+
+std::size_t Reader::ResolveName(const PendingName& name) {
+    const auto found = m_viewIndex.find(name.name);
+    if (found != m_viewIndex.end()) {
+        return found->second;
+    }
+    if (!m_unknown || name.line < m_unknown->line) {
+        m_unknown = name;
+    }
+    return 0;
+}
+
+// Names are resolved after the whole file is read, so that a view may be used above its
+// declaration; the error reported is still the one of the first bad line.
+bool Reader::Resolve() {
+    if (m_defaultView) {
+        m_out.defaultView = ResolveName(*m_defaultView);
+        m_out.hasDefault = true;
+    }
+    std::vector<std::size_t> unitViews;
+    unitViews.reserve(m_units.size());
+    for (const PendingUnit& pending : m_units) {
+        unitViews.push_back(ResolveName(pending.view));
+    }
+    std::vector<std::pair<std::size_t, std::vector<std::size_t>>> bindingViews;
+    bindingViews.reserve(m_bindings.size());
+    for (const PendingBinding& pending : m_bindings) {
+        std::vector<std::size_t> produced;
+        for (const PendingName& name : pending.produced) {
+            produced.push_back(ResolveName(name));
+        }
+        bindingViews.emplace_back(ResolveName(pending.view), std::move(produced));
+    }
+    if (m_unknown) {
+        return Fail(m_unknown->line, "no view named '" + m_unknown->name + "'");
+    }
+    for (std::size_t i = 0; i < m_units.size(); ++i) {
+        m_out.views[unitViews[i]].units.push_back(std::move(m_units[i].unit));
+    }
+    for (auto& [view, produced] : bindingViews) {
+        m_out.views[view].bindings.push_back(std::move(produced));
+    }
+    return true;
+}
+
+} // namespace
+
+bool ParseDescription(std::string_view text, Description& out, ParseError& error) {
+    out = Description{};
+    Reader reader(out, error);
+    return reader.ReadLines(text) && reader.Resolve();
 }
 
 } // namespace SampleHost

@@ -3,6 +3,7 @@
 
 #include "Globals.h"
 #include "Port/File.h"
+#include "Port/SearchPath.h"
 #include "Port/StringBase.h"
 
 #include <cxxabi.h>
@@ -19,18 +20,7 @@ namespace CitP {
 namespace {
 
 std::vector<std::string> SearchDirectories() {
-    std::vector<std::string> dirs;
-    if (const char* env = std::getenv("VENLOMER_COMPONENT_PATH")) {
-        std::string list(env);
-        size_t start = 0;
-        while (start <= list.size()) {
-            const size_t end = std::min(list.find(':', start), list.size());
-            if (end > start) {
-                dirs.push_back(list.substr(start, end - start));
-            }
-            start = end + 1;
-        }
-    }
+    std::vector<std::string> dirs = Port::SearchPathFromEnv("VENLOMER_COMPONENT_PATH");
     // The directory this layer was loaded from: the build tree's library folder in tests,
     // the install libdir once installed.
     Dl_info info{};

@@ -1,6 +1,7 @@
 //===-- Regexp.cpp - RE2 behind Port_Regexp, with a compile cache ---------------===//
 #include "Port/Regexp.h"
 
+#include "Port/LastBuilt.h"
 #include "Port/StringBase.h"
 
 #include <re2/re2.h>
@@ -221,27 +222,41 @@ private:
     };
     std::optional<ClassChar> ReadClassChar(Letters& held) {
         const char c = m_p[m_i];
-        if (c == '[' && m_i + 1 < m_p.size() && m_p[m_i + 1] == ':') {
-            const size_t close = m_p.find(":]", m_i + 2);
-            if (close != std::string_view::npos) {
-                std::string_view name = m_p.substr(m_i + 2, close - m_i - 2);
-                const bool negated = !name.empty() && name.front() == '^';
-                if (negated) {
-                    name.remove_prefix(1);
-                }
-                if (name == "upper") {
-                    held |= negated ? kLower : kUpper;
-                } else if (name == "lower") {
-                    held |= negated ? kUpper : kLower;
-                }
-                m_i = close + 2;
-                return ClassChar{};
-            }
+        if (PosixClass(held)) {
+            return ClassChar{};
         }
         if (c != '\\') {
             ++m_i;
             return ClassChar{true, static_cast<unsigned char>(c), c == '-'};
         }
+        return ClassEscape(held);
+    }
+
+    // [:name:] at m_i: skipped, its letters added to `held`. False when there is none.
+    bool PosixClass(Letters& held) {
+        if (m_p[m_i] != '[' || m_i + 1 >= m_p.size() || m_p[m_i + 1] != ':') {
+            return false;
+        }
+        const size_t close = m_p.find(":]", m_i + 2);
+        if (close == std::string_view::npos) {
+            return false;
+        }
+        std::string_view name = m_p.substr(m_i + 2, close - m_i - 2);
+        const bool negated = !name.empty() && name.front() == '^';
+        if (negated) {
+            name.remove_prefix(1);
+        }
+        if (name == "upper") {
+            held |= negated ? kLower : kUpper;
+        } else if (name == "lower") {
+            held |= negated ? kUpper : kLower;
+        }
+        m_i = close + 2;
+        return true;
+    }
+
+    // A backslash escape inside a class, at m_i; as ReadClassChar.
+    std::optional<ClassChar> ClassEscape(Letters& held) {
         if (m_i + 1 >= m_p.size()) {
             return std::nullopt;
         }
@@ -392,64 +407,12 @@ private:
     bool Step() {
         const char c = m_p[m_i];
         switch (c) {
-        case '\\': {
-            if (m_i + 1 >= m_p.size()) {
-                return false;
-            }
-            const char e = m_p[m_i + 1];
-            if (e == 'Q') {
-                const size_t end = m_p.find("\\E", m_i + 2);
-                const std::string_view quoted =
-                    m_p.substr(m_i + 2, end == std::string_view::npos ? std::string_view::npos
-                                                                      : end - m_i - 2);
-                for (const char q : quoted) {
-                    EmitLiteral(static_cast<unsigned char>(q));
-                }
-                m_i = end == std::string_view::npos ? m_p.size() : end + 2;
-                return true;
-            }
-            if (e == 'x' || IsOctal(e)) {
-                auto value = NumericEscape();
-                if (!value) {
-                    return false;
-                }
-                EmitLiteral(*value);
-                return true;
-            }
-            if (e == 'p' || e == 'P') {
-                auto named = UnicodeClassEscape();
-                if (!named) {
-                    return false;
-                }
-                const std::string extra = m_fold ? Completion(named->second) : std::string();
-                m_out += extra.empty() ? named->first : "[" + named->first + extra + "]";
-                return true;
-            }
-            m_out.append(m_p.substr(m_i, 2));
-            m_i += 2;
-            return true;
-        }
+        case '\\':
+            return Escape();
         case '[':
             return Class();
         case '(':
-            if (m_i + 1 < m_p.size() && m_p[m_i + 1] == '?') {
-                const char kind = m_i + 2 < m_p.size() ? m_p[m_i + 2] : '\0';
-                if (kind == 'P' || kind == '<') {
-                    const size_t close = m_p.find('>', m_i);
-                    if (close == std::string_view::npos) {
-                        return false;
-                    }
-                    m_saved.push_back(m_fold);
-                    m_out.append(m_p.substr(m_i, close + 1 - m_i));
-                    m_i = close + 1;
-                    return true;
-                }
-                return FlagGroup();
-            }
-            m_saved.push_back(m_fold);
-            m_out += '(';
-            ++m_i;
-            return true;
+            return OpenGroup();
         case ')':
             if (m_saved.empty()) {
                 return false;
@@ -468,6 +431,66 @@ private:
             ++m_i;
             return true;
         }
+    }
+
+    // A backslash escape outside a class, at m_i.
+    bool Escape() {
+        if (m_i + 1 >= m_p.size()) {
+            return false;
+        }
+        const char e = m_p[m_i + 1];
+        if (e == 'Q') {
+            const size_t end = m_p.find("\\E", m_i + 2);
+            const std::string_view quoted = m_p.substr(
+                m_i + 2, end == std::string_view::npos ? std::string_view::npos : end - m_i - 2);
+            for (const char q : quoted) {
+                EmitLiteral(static_cast<unsigned char>(q));
+            }
+            m_i = end == std::string_view::npos ? m_p.size() : end + 2;
+            return true;
+        }
+        if (e == 'x' || IsOctal(e)) {
+            auto value = NumericEscape();
+            if (!value) {
+                return false;
+            }
+            EmitLiteral(*value);
+            return true;
+        }
+        if (e == 'p' || e == 'P') {
+            auto named = UnicodeClassEscape();
+            if (!named) {
+                return false;
+            }
+            const std::string extra = m_fold ? Completion(named->second) : std::string();
+            m_out += extra.empty() ? named->first : "[" + named->first + extra + "]";
+            return true;
+        }
+        m_out.append(m_p.substr(m_i, 2));
+        m_i += 2;
+        return true;
+    }
+
+    // An opening parenthesis at m_i: a plain, named or flag group.
+    bool OpenGroup() {
+        if (m_i + 1 < m_p.size() && m_p[m_i + 1] == '?') {
+            const char kind = m_i + 2 < m_p.size() ? m_p[m_i + 2] : '\0';
+            if (kind == 'P' || kind == '<') {
+                const size_t close = m_p.find('>', m_i);
+                if (close == std::string_view::npos) {
+                    return false;
+                }
+                m_saved.push_back(m_fold);
+                m_out.append(m_p.substr(m_i, close + 1 - m_i));
+                m_i = close + 1;
+                return true;
+            }
+            return FlagGroup();
+        }
+        m_saved.push_back(m_fold);
+        m_out += '(';
+        ++m_i;
+        return true;
     }
 
     std::string_view m_p;
@@ -576,17 +599,9 @@ PatternCache& SharedCache() {
 // In front of the shared cache, the last pattern of this thread: a search compares every
 // holder with the same pattern, so most constructions take no lock at all.
 CompiledPtr Lookup(std::string_view pattern, bool ignoreCase) {
-    thread_local std::string lastPattern;
-    thread_local bool lastIgnoreCase = false;
-    thread_local CompiledPtr lastCompiled;
-    if (lastCompiled && lastIgnoreCase == ignoreCase && lastPattern == pattern) {
-        return lastCompiled;
-    }
-    CompiledPtr compiled = SharedCache().Get(pattern, ignoreCase);
-    lastPattern.assign(pattern);
-    lastIgnoreCase = ignoreCase;
-    lastCompiled = compiled;
-    return compiled;
+    thread_local Port::LastBuilt<CompiledPtr> last;
+    return last.Get(pattern, ignoreCase ? 1 : 0,
+                    [&] { return SharedCache().Get(pattern, ignoreCase); });
 }
 
 } // namespace

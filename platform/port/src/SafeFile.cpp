@@ -181,7 +181,99 @@ struct SafeWriter::State {
         error = "cannot write " + target + ": " + why;
         return false;
     }
+
+    // A device or a pipe is written in place: there is nothing to replace it with.
+    bool OpenDirect(const struct stat& info, std::string& error) {
+        fd = ::open(target.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC);
+        struct stat opened {};
+        if (fd < 0) {
+            return Fail(error, Reason(errno));
+        }
+        // The name may have been swapped for something else since it was looked at.
+        if (::fstat(fd, &opened) != 0 || opened.st_dev != info.st_dev ||
+            opened.st_ino != info.st_ino) {
+            return Fail(error, "it changed while being opened");
+        }
+        direct = true;
+        working = target;
+        return true;
+    }
+
+    // The name the result goes under: a link's target, so that the link stays a link.
+    bool ResolveFinal(const struct stat& link, std::string& error) {
+        if (!S_ISLNK(link.st_mode)) {
+            final = target;
+            return true;
+        }
+        char* resolved = ::realpath(target.c_str(), nullptr);
+        if (resolved == nullptr) {
+            return Fail(error, Reason(errno));
+        }
+        final = resolved;
+        std::free(resolved);
+        return true;
+    }
+
+    // The replaced file's owner, group and mode for the temporary that replaces it.
+    bool TakeOwnerAndMode(const struct stat& info, std::string& error) {
+        // Owner and group can only be given away with the privilege to; the mode always.
+        if (info.st_uid != ::geteuid() || info.st_gid != ::getegid()) {
+            (void)!::fchown(fd, info.st_uid, info.st_gid);
+        }
+        if (::fchmod(fd, info.st_mode & 07777) != 0) {
+            return Fail(error, Reason(errno));
+        }
+        return true;
+    }
+
+    // A new temporary with a unique name in `folder`, opened exclusively and never
+    // through a link planted under its name.
+    bool CreateTemporary(mode_t createMode, std::string& error) {
+        const std::string prefix = (folder == "/" ? "" : folder) + "/" + kTempPrefix +
+                                   Hex(static_cast<std::uint32_t>(::getpid())) + "-";
+        for (int attempt = 0; attempt < 100 && fd < 0; ++attempt) {
+            std::string name = prefix + Hex(RandomPart()) + kTempSuffix;
+            const int opened = ::open(
+                name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, createMode);
+            if (opened >= 0) {
+                fd = opened;
+                working = std::move(name);
+            } else if (errno != EEXIST) {
+                return Fail(error,
+                            "cannot create a temporary file in " + folder + ": " + Reason(errno));
+            }
+        }
+        if (fd < 0) {
+            return Fail(error, "no free temporary name in " + folder);
+        }
+        return true;
+    }
 };
+
+namespace {
+
+// Why the file `info` describes must not be written: it is one of the inputs, by name or
+// by identity. Empty when it is none of them.
+std::string SameAsAnInput(const struct stat& info, const std::vector<std::string>& inputs,
+                          const std::vector<FileIdentity>& inputIds) {
+    for (const std::string& input : inputs) {
+        struct stat in {};
+        if (::stat(input.c_str(), &in) == 0 && in.st_dev == info.st_dev &&
+            in.st_ino == info.st_ino) {
+            return "it is the same file as the input " + input;
+        }
+    }
+    const FileIdentity id{static_cast<std::uint64_t>(info.st_dev),
+                          static_cast<std::uint64_t>(info.st_ino)};
+    for (const FileIdentity& input : inputIds) {
+        if (input == id) {
+            return "it is the same file as an input";
+        }
+    }
+    return {};
+}
+
+} // namespace
 
 SafeWriter::SafeWriter() = default;
 SafeWriter::~SafeWriter() = default;
@@ -212,51 +304,21 @@ bool SafeWriter::Open(const std::string& target, std::string& error,
     }
 
     if (exists) {
-        const FileIdentity id{static_cast<std::uint64_t>(info.st_dev),
-                              static_cast<std::uint64_t>(info.st_ino)};
-        for (const std::string& input : inputs) {
-            struct stat in {};
-            if (::stat(input.c_str(), &in) == 0 && in.st_dev == info.st_dev &&
-                in.st_ino == info.st_ino) {
-                return s.Fail(error, "it is the same file as the input " + input);
-            }
-        }
-        for (const FileIdentity& input : inputIds) {
-            if (input == id) {
-                return s.Fail(error, "it is the same file as an input");
-            }
+        if (const std::string same = SameAsAnInput(info, inputs, inputIds); !same.empty()) {
+            return s.Fail(error, same);
         }
         if (mode == Mode::CreateOnly) {
             error = target + " exists already";
             return false;
         }
         if (S_ISCHR(info.st_mode) || S_ISFIFO(info.st_mode)) {
-            s.fd = ::open(target.c_str(), O_WRONLY | O_NOCTTY | O_CLOEXEC);
-            struct stat opened {};
-            if (s.fd < 0) {
-                return s.Fail(error, Reason(errno));
-            }
-            // The name may have been swapped for something else since it was looked at.
-            if (::fstat(s.fd, &opened) != 0 || opened.st_dev != info.st_dev ||
-                opened.st_ino != info.st_ino) {
-                return s.Fail(error, "it changed while being opened");
-            }
-            s.direct = true;
-            s.working = target;
-            return true;
+            return s.OpenDirect(info, error);
         }
         if (!S_ISREG(info.st_mode)) {
             return s.Fail(error, "it is " + KindName(info.st_mode));
         }
-        if (S_ISLNK(link.st_mode)) {
-            char* resolved = ::realpath(target.c_str(), nullptr);
-            if (resolved == nullptr) {
-                return s.Fail(error, Reason(errno));
-            }
-            s.final = resolved;
-            std::free(resolved);
-        } else {
-            s.final = target;
+        if (!s.ResolveFinal(link, error)) {
+            return false;
         }
     } else {
         s.final = target;
@@ -265,34 +327,10 @@ bool SafeWriter::Open(const std::string& target, std::string& error,
     CleanLeftoverTemporaries(s.folder);
 
     // A replaced file's mode is set explicitly below, so the temporary starts private.
-    const mode_t createMode = exists ? 0600 : 0666;
-    const std::string prefix = (s.folder == "/" ? "" : s.folder) + "/" + kTempPrefix +
-                               Hex(static_cast<std::uint32_t>(::getpid())) + "-";
-    for (int attempt = 0; attempt < 100 && s.fd < 0; ++attempt) {
-        std::string name = prefix + Hex(RandomPart()) + kTempSuffix;
-        const int fd =
-            ::open(name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, createMode);
-        if (fd >= 0) {
-            s.fd = fd;
-            s.working = std::move(name);
-        } else if (errno != EEXIST) {
-            return s.Fail(error,
-                          "cannot create a temporary file in " + s.folder + ": " + Reason(errno));
-        }
+    if (!s.CreateTemporary(exists ? 0600 : 0666, error)) {
+        return false;
     }
-    if (s.fd < 0) {
-        return s.Fail(error, "no free temporary name in " + s.folder);
-    }
-    if (exists) {
-        // Owner and group can only be given away with the privilege to; the mode always.
-        if (info.st_uid != ::geteuid() || info.st_gid != ::getegid()) {
-            (void)!::fchown(s.fd, info.st_uid, info.st_gid);
-        }
-        if (::fchmod(s.fd, info.st_mode & 07777) != 0) {
-            return s.Fail(error, Reason(errno));
-        }
-    }
-    return true;
+    return !exists || s.TakeOwnerAndMode(info, error);
 }
 
 bool SafeWriter::Write(std::string_view bytes, std::string& error) {

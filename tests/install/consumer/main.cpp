@@ -1,3 +1,4 @@
+//===-- tests/install/consumer/main.cpp - a consumer builds against the installed tree -===//
 #include "s/CStringContainer.h"
 
 #include <cstdio>
