@@ -65,9 +65,8 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
                    int flags) {
     // A search compares a million values with one pattern: keep the last expression
     // built, so each comparison costs a text compare and one anchored match.
-    thread_local Port::LastBuilt<Port_Regexp> last;
     const int shape = flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
-    const Port_Regexp& expression = last.Get(pattern.view(), shape, [&] {
+    const auto build = [&] {
         // Case is ignored by the expression itself (ASCII letters, as everywhere else):
         // upper-casing the pattern would turn escapes such as \d, \w and \s into their
         // negations. With the expression ignoring case, upper-casing the value as well
@@ -96,9 +95,13 @@ bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<c
             }
         }
         return compiled;
-    });
+    };
     // The value matches when a match of the expression starts at its first byte.
-    return expression.MatchesAtStart(value.view());
+    if (Port::LastBuilt<Port_Regexp>::Gone()) {
+        return build().MatchesAtStart(value.view());
+    }
+    thread_local Port::LastBuilt<Port_Regexp> last;
+    return last.Get(pattern.view(), shape, build).MatchesAtStart(value.view());
 }
 
 } // namespace

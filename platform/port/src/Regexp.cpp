@@ -592,13 +592,18 @@ private:
 };
 
 PatternCache& SharedCache() {
-    static PatternCache cache;
+    // Never destroyed: a static object of the host may still compile a pattern while the
+    // process's statics are being torn down.
+    static PatternCache& cache = *new PatternCache;
     return cache;
 }
 
 // In front of the shared cache, the last pattern of this thread: a search compares every
 // holder with the same pattern, so most constructions take no lock at all.
 CompiledPtr Lookup(std::string_view pattern, bool ignoreCase) {
+    if (Port::LastBuilt<CompiledPtr>::Gone()) {
+        return SharedCache().Get(pattern, ignoreCase);
+    }
     thread_local Port::LastBuilt<CompiledPtr> last;
     return last.Get(pattern, ignoreCase ? 1 : 0,
                     [&] { return SharedCache().Get(pattern, ignoreCase); });

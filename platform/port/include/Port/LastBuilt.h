@@ -7,8 +7,13 @@
 // from, and builds again only when either changes. Keep one per thread, as a
 // thread_local: it takes no lock, and a value is then never shared between threads.
 //
+// The runtime destroys a thread's thread_locals before its statics (and before older
+// thread_locals), and a host object dying then may still compare texts. So ask Gone()
+// before reaching the thread_local, and build afresh once it has been destroyed:
+//
+//   if (Port::LastBuilt<Port_Regexp>::Gone()) { return use(Port_Regexp(pattern)); }
 //   thread_local Port::LastBuilt<Port_Regexp> last;
-//   const Port_Regexp& re = last.Get(pattern, flags, [&] { return Port_Regexp(pattern); });
+//   return use(last.Get(pattern, flags, [&] { return Port_Regexp(pattern); }));
 //
 //===------------------------------------------------------------------------------===//
 #pragma once
@@ -22,6 +27,18 @@ namespace Port {
 
 template <class Value> class LastBuilt {
 public:
+    LastBuilt() = default;
+    ~LastBuilt() { Gone() = true; }
+    LastBuilt(const LastBuilt&) = delete;
+    LastBuilt& operator=(const LastBuilt&) = delete;
+
+    /// True on this thread once a LastBuilt<Value> of it has been destroyed (thread or
+    /// process exit). The flag is trivially destructible, so it is never torn down itself.
+    static bool& Gone() {
+        thread_local bool gone = false;
+        return gone;
+    }
+
     /// The value last built from `text` and `options`; calls `build()` (which returns a
     /// Value) first when there is none. If build throws, nothing is kept, and the next
     /// call builds again. The reference is valid until the next Get on this object.
