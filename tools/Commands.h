@@ -18,6 +18,7 @@ const Command& NgcStubCommand();
 const Command& NgcNewCommand();
 const Command& NgdSampleCommand();
 const Command& ProjectFilesCommand();
+const Command& EditCommand();
 
 /// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
 int UsageError(const std::string& command, const std::string& why);

@@ -27,6 +27,7 @@ const std::vector<const Command*>& AllCommands() {
     static const std::vector<const Command*> commands = {
         &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),    &VnTool::NgcStubCommand(),
         &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(), &VnTool::ProjectFilesCommand(),
+        &VnTool::EditCommand(),
     };
     return commands;
 }
