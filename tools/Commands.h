@@ -2,8 +2,12 @@
 #pragma once
 
 #include "Args.h"
+#include "DeviceModel.h"
+#include "DeviceOptions.h"
 
+#include <memory>
 #include <string>
+#include <vector>
 
 namespace VnTool {
 
@@ -29,8 +33,12 @@ int Refused(const std::string& command, const std::string& why);
 /// must state its reason itself.
 int LibraryErrorCount();
 
-/// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
-/// then in share/venlomer beside the program's bin folder. Empty when not found.
-std::string FindDataFile(const std::string& name);
+/// --chipdb, --device and --package, as every device command declares them.
+std::vector<OptionSyntax> DeviceOptionSyntax();
+
+/// Resolves the device options of `args` and reads the chip database. Returns kExitOk
+/// with `model` set, or the status of the usage error or refusal it has reported.
+int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
+               std::unique_ptr<DeviceModel>& model);
 
 } // namespace VnTool

@@ -4,9 +4,6 @@
 #include "Port/SafeFile.h"
 
 #include <cstdio>
-#include <cstdlib>
-#include <filesystem>
-#include <system_error>
 
 namespace VnTool {
 
@@ -22,34 +19,36 @@ int Refused(const std::string& command, const std::string& why) {
     return kExitRefused;
 }
 
-std::string FindDataFile(const std::string& name) {
-    namespace fs = std::filesystem;
-    std::error_code ec;
-    if (const char* path = std::getenv("VENLOMER_DATA_PATH")) {
-        std::string folders(path);
-        std::size_t start = 0;
-        while (start <= folders.size()) {
-            std::size_t end = folders.find(':', start);
-            if (end == std::string::npos) {
-                end = folders.size();
-            }
-            if (end > start) {
-                fs::path candidate = fs::path(folders.substr(start, end - start)) / name;
-                if (fs::is_regular_file(candidate, ec)) {
-                    return candidate.string();
-                }
-            }
-            start = end + 1;
+std::vector<OptionSyntax> DeviceOptionSyntax() {
+    return {
+        {"--chipdb", "FILE", "chip database (default: chipdb-8k.txt of fpga-icestorm-chipdb)"},
+        {"--device", "NAME", "chipdb-NAME.txt of the chip-database folder (1k, 8k, ...)"},
+        {"--package", "NAME", "package whose pins to read (default: ct256, else the first)"},
+    };
+}
+
+int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
+               std::unique_ptr<DeviceModel>& model) {
+    DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
+    for (const char* option : {"--chipdb", "--device"}) {
+        if (args.Has(option) && args.Value(option).empty()) {
+            return UsageError(command, std::string(option) + " wants a name");
         }
     }
-    fs::path self = fs::read_symlink("/proc/self/exe", ec);
-    if (!ec) {
-        fs::path candidate = self.parent_path().parent_path() / "share" / "venlomer" / name;
-        if (fs::is_regular_file(candidate, ec)) {
-            return candidate.string();
-        }
+    std::string error;
+    switch (ResolveDevice(request, source, error)) {
+    case DeviceResolution::Ok:
+        break;
+    case DeviceResolution::BadUsage:
+        return UsageError(command, error);
+    case DeviceResolution::Missing:
+        return Refused(command, error);
     }
-    return {};
+    model = DeviceModel::Open(source, error);
+    if (!model) {
+        return Refused(command, error);
+    }
+    return kExitOk;
 }
 
 } // namespace VnTool

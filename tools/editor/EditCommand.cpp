@@ -8,6 +8,8 @@
 #include "Editor.h"
 #include "Server.h"
 
+#include "DeviceOptions.h"
+
 #include <condition_variable>
 #include <csignal>
 #include <cstdio>

@@ -1,0 +1,291 @@
+//===-- tools/DeviceSearch.cpp - search, select and print a device model's holders ===//
+#include "DeviceSearch.h"
+
+#include "Commands.h"
+
+#include "VnI/IDeviceResource.h"
+#include "VnI/ITreeNode.h"
+#include "VnI/PropertyType.h"
+#include "s/FindItr.h"
+#include "s/PropertyFactory.h"
+#include "s/PropertyHolderItr.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstdio>
+#include <list>
+
+namespace VnTool {
+
+namespace {
+
+template <class T> using Ptr = CommonI::RefCountPtr<T>;
+
+struct FlagName {
+    const char* name;
+    int bit;
+};
+
+// The compare flags by the names the user types.
+const FlagName kFlagNames[] = {
+    {"exact", VnI::MATCH_EXACT},
+    {"ignore-case", VnI::MATCH_IGNORE_CASE},
+    {"substring", VnI::MATCH_SUBSTRING},
+    {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
+    {"less", VnI::MATCH_LESS},
+    {"greater", VnI::MATCH_GREATER},
+    {"any", VnI::MATCH_ANY},
+    {"regexp", VnI::MATCH_REGEXP},
+};
+
+bool ParseFlags(const std::string& list, int& flags, std::string& error) {
+    flags = 0;
+    std::size_t start = 0;
+    while (start <= list.size()) {
+        std::size_t end = list.find_first_of(",|+", start);
+        if (end == std::string::npos) {
+            end = list.size();
+        }
+        std::string word = list.substr(start, end - start);
+        bool known = false;
+        for (const auto& flag : kFlagNames) {
+            if (word == flag.name) {
+                flags |= flag.bit;
+                known = true;
+            }
+        }
+        if (!known) {
+            error = "unknown compare flag \"" + word +
+                    "\"; use exact, ignore-case, substring, within-5-percent, less, greater, "
+                    "any, regexp";
+            return false;
+        }
+        start = end + 1;
+    }
+    return true;
+}
+
+int CountChildren(const Ptr<VnI::ITreeNode>& node) {
+    int count = 0;
+    for (auto it = node->GetChildren(); !it->IsEnd(); it->Next()) {
+        ++count;
+    }
+    return count;
+}
+
+std::vector<std::string> ColumnNames(VnI::IPropertyNameList* names) {
+    std::vector<std::string> columns;
+    for (int i = 0; i < names->GetNumNames(); ++i) {
+        columns.push_back(names->GetPropertyName(i)->GetName().str());
+    }
+    return columns;
+}
+
+} // namespace
+
+std::vector<OptionSyntax> SearchOptionSyntax() {
+    return {
+        {"--find", "NAME=VALUE", "search the banks and pins for a property value"},
+        {"--flags", "LIST", "compare flags of the search, comma separated"},
+    };
+}
+
+int ParseSearchArgs(const std::string& command, const ParsedArgs& args, SearchRequest& request) {
+    std::string error;
+    if (args.Has("--flags") && !ParseFlags(args.Value("--flags"), request.flags, error)) {
+        return UsageError(command, error);
+    }
+    if (args.Has("--find")) {
+        std::string find = args.Value("--find");
+        auto eq = find.find('=');
+        if (eq == std::string::npos || eq == 0) {
+            return UsageError(command, "--find wants NAME=VALUE, got \"" + find + "\"");
+        }
+        request.active = true;
+        request.name = find.substr(0, eq);
+        request.value = find.substr(eq + 1);
+    } else if (args.Has("--flags")) {
+        return UsageError(command, "--flags needs --find");
+    }
+    return kExitOk;
+}
+
+std::string FlagsText(int flags) {
+    std::string text;
+    for (const auto& flag : kFlagNames) {
+        if ((flags & flag.bit) != 0) {
+            text += (text.empty() ? "" : ",") + std::string(flag.name);
+        }
+    }
+    return text.empty() ? "exact" : text;
+}
+
+std::string ValueText(const Ptr<VnI::IProperty>& property) {
+    if (!property) {
+        return "";
+    }
+    switch (property->GetType()) {
+    case VnI::INT_TYPE:
+        return std::to_string(property->GetIntProperty());
+    case VnI::DOUBLE_TYPE:
+        return std::to_string(property->GetDoubleProperty());
+    case VnI::BOOL_TYPE:
+        return property->GetBoolProperty() ? "yes" : "no";
+    default:
+        return property->GetStringProperty().str();
+    }
+}
+
+int MakeWanted(const std::string& command, const SearchRequest& request,
+               const std::vector<SearchKind>& kinds, const std::string& who,
+               const std::string& known, Ptr<VnI::IProperty>& wanted) {
+    Port::StringBase<char> name(request.name.c_str());
+    VnI::IPropertyNameList* declaring = nullptr;
+    int position = -1;
+    for (const SearchKind& kind : kinds) {
+        if (declaring == nullptr && (position = kind.names->Contains(name)) >= 0) {
+            declaring = kind.names;
+        }
+    }
+    if (declaring == nullptr) {
+        return UsageError(command,
+                          who + " have no property \"" + request.name + "\"; they have " + known);
+    }
+    if (declaring->GetPropertyName(position)->GetType() == VnI::INT_TYPE) {
+        int value = 0;
+        const std::string& text = request.value;
+        auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), value);
+        if (ec != std::errc() || end != text.data() + text.size()) {
+            return UsageError(command, request.name + " is a whole number; got \"" + text + "\"");
+        }
+        wanted =
+            Ptr<VnI::IProperty>::Adopt(Vn::Eng::PropertyFactory::CreateIntProperty(value, true));
+    } else {
+        wanted = Ptr<VnI::IProperty>::Adopt(
+            Vn::Eng::PropertyFactory::CreateStringProperty(request.value.c_str(), true));
+    }
+    return kExitOk;
+}
+
+// Read back through the model, as a tree view would fill itself.
+void PrintTree(DeviceModel& model) {
+    auto root = model.Tree()->GetRootNode();
+    std::string line = "Tree: " + root->GetDataRef()->GetName().str() + " >";
+    bool first = true;
+    for (auto it = root->GetChildren(); !it->IsEnd(); it->Next()) {
+        auto child = it->CurrentItem();
+        VnI::IPropertyHolder* holder = child->GetDataRef();
+        int count = CountChildren(child);
+        std::string name = holder != nullptr ? holder->GetName().str() : "Tiles";
+        line += std::string(first ? " " : ", ") + name + " (" + std::to_string(count) +
+                (holder != nullptr ? " pins)" : ")");
+        first = false;
+    }
+    std::printf("%s\n", line.c_str());
+}
+
+void PrintTable(const std::vector<std::string>& columns,
+                const std::vector<std::vector<std::string>>& rows) {
+    std::vector<std::size_t> widths(columns.size());
+    for (std::size_t c = 0; c < columns.size(); ++c) {
+        widths[c] = columns[c].size();
+        for (const auto& row : rows) {
+            widths[c] = std::max(widths[c], row[c].size());
+        }
+    }
+    auto printRow = [&](const std::vector<std::string>& cells) {
+        std::string line = " ";
+        for (std::size_t c = 0; c < cells.size(); ++c) {
+            line += " " + cells[c];
+            if (c + 1 < cells.size()) {
+                line += std::string(widths[c] - cells[c].size(), ' ') + " ";
+            }
+        }
+        std::printf("%s\n", line.c_str());
+    };
+    printRow(columns);
+    for (const auto& row : rows) {
+        printRow(row);
+    }
+}
+
+std::vector<VnI::IPropertyHolder*>
+SearchAndPrint(const SearchRequest& request, const Ptr<VnI::IProperty>& wanted,
+               const std::vector<VnI::IPropertyHolder*>& candidates,
+               const std::vector<SearchKind>& kinds, const std::string& over) {
+    std::list<VnI::IPropertyHolder*> list(candidates.begin(), candidates.end());
+    auto found = Vn::Eng::FindItr::CreateInstance(Vn::Eng::PropertyHolderItr::CreateInstance(&list),
+                                                  Port::StringBase<char>(request.name.c_str()),
+                                                  wanted, request.flags);
+    std::vector<VnI::IPropertyHolder*> matches;
+    for (; !found->IsEnd(); found->Next()) {
+        matches.push_back(found->CurrentItem());
+    }
+    std::printf("Search: %s = \"%s\" (%s) over %s: %zu %s\n", request.name.c_str(),
+                request.value.c_str(), FlagsText(request.flags).c_str(), over.c_str(),
+                matches.size(), matches.size() == 1 ? "match" : "matches");
+    // One table per kind among the matches, in the order the kinds first match.
+    std::vector<VnI::IPropertyNameList*> seen;
+    for (auto* holder : matches) {
+        VnI::IPropertyNameList* kind = holder->GetPropertyNames();
+        if (std::find(seen.begin(), seen.end(), kind) != seen.end()) {
+            continue;
+        }
+        seen.push_back(kind);
+        std::string title = "Matches";
+        for (const SearchKind& known : kinds) {
+            if (known.names == kind) {
+                title = known.title;
+            }
+        }
+        std::printf("%s:\n", title.c_str());
+        std::vector<std::string> columns = ColumnNames(kind);
+        std::vector<std::vector<std::string>> rows;
+        for (auto* match : matches) {
+            if (match->GetPropertyNames() != kind) {
+                continue;
+            }
+            std::vector<std::string> row;
+            for (const auto& column : columns) {
+                row.push_back(ValueText(match->GetPropertyByName(column.c_str())));
+            }
+            rows.push_back(std::move(row));
+        }
+        PrintTable(columns, rows);
+    }
+    return matches;
+}
+
+void SelectAndHighlight(DeviceModel& model, const std::vector<VnI::IPropertyHolder*>& matches) {
+    for (auto* holder : matches) {
+        model.Selection().AddSelectedItem(holder, true);
+    }
+    int selected = 0;
+    int highlighted = 0;
+    for (auto it = model.Selection().GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
+        VnI::IPropertyHolder* holder = it->CurrentItem();
+        ++selected;
+        if (holder->GetPropertyNames() == model.PinNames()) {
+            // Resources are not counted: the plain interface pointer is all there is.
+            model.Highlight().AddHighlightedItem(static_cast<VnI::IDeviceResource*>(
+                holder->GetInterface(VnI::IDeviceResource::kIID)));
+            ++highlighted;
+        }
+    }
+    std::printf("Selected: %d resources (category %d, pins below matched banks included)\n",
+                selected, VnI::DEVICE_RESOURCE_HOLDER_TYPE);
+    std::printf("Highlighted: %d pins\n", highlighted);
+}
+
+void SearchDevice(DeviceModel& model, const SearchRequest& request,
+                  const Ptr<VnI::IProperty>& wanted) {
+    std::vector<VnI::IPropertyHolder*> candidates(model.Banks().begin(), model.Banks().end());
+    candidates.insert(candidates.end(), model.Pins().begin(), model.Pins().end());
+    std::string over = std::to_string(model.Banks().size()) + " banks and " +
+                       std::to_string(model.Pins().size()) + " pins";
+    auto matches = SearchAndPrint(request, wanted, candidates,
+                                  {{model.PinNames(), "Pins"}, {model.BankNames(), "Banks"}}, over);
+    SelectAndHighlight(model, matches);
+}
+
+} // namespace VnTool

@@ -1,0 +1,63 @@
+//===-- tools/device/DeviceOptions.h - which chip database a command opens --------===//
+//
+// \file
+// Every subcommand that shows or plans a device takes the same three options and means
+// the same by them:
+//
+//   --chipdb FILE   that chip database ("-" for standard input)
+//   --device NAME   chipdb-NAME.txt of the chip-database folder
+//   --package NAME  the package whose pins are read
+//
+// With neither --chipdb nor --device the 8k device in ct256 is opened from the
+// chip-database folder when it is installed, else the demo device bundled with venlomer,
+// with a note saying so. The folder is /usr/share/fpga-icestorm/chipdb unless
+// VENLOMER_CHIPDB_DIR names another.
+//
+//   VnTool::DeviceRequest request;            // filled from the command line
+//   VnTool::DeviceSource source;
+//   std::string error;
+//   switch (VnTool::ResolveDevice(request, source, error)) { ... }
+//
+//===------------------------------------------------------------------------------===//
+#pragma once
+
+#include <string>
+
+namespace VnTool {
+
+/// The folder chipdb-NAME.txt files are looked up in when VENLOMER_CHIPDB_DIR is unset.
+inline constexpr char kDefaultChipDbFolder[] = "/usr/share/fpga-icestorm/chipdb";
+
+/// The device options as the user gave them; an option not given is empty.
+struct DeviceRequest {
+    std::string chipDb;  ///< --chipdb
+    std::string device;  ///< --device
+    std::string package; ///< --package
+};
+
+/// The file and package to read.
+struct DeviceSource {
+    std::string chipDb;
+    std::string package; ///< empty: the first package of the file
+    std::string note;    ///< why the device is not the one the user may expect; else empty
+};
+
+enum class DeviceResolution {
+    Ok,
+    BadUsage, ///< the options contradict each other or a name is malformed
+    Missing,  ///< no chip database could be found
+};
+
+/// The chip-database folder: VENLOMER_CHIPDB_DIR, else kDefaultChipDbFolder.
+std::string ChipDbFolder();
+
+/// Decides which file and package a request means. On anything but Ok, `error` holds a
+/// one-line reason and `source` is unspecified. Looks at the file system, reads nothing.
+DeviceResolution ResolveDevice(const DeviceRequest& request, DeviceSource& source,
+                               std::string& error);
+
+/// A data file shipped with venlomer: looked up in the folders of VENLOMER_DATA_PATH,
+/// then in share/venlomer beside the program's bin folder. Empty when not found.
+std::string FindDataFile(const std::string& name);
+
+} // namespace VnTool
