@@ -24,15 +24,9 @@ namespace VnTool {
 namespace {
 
 const char kCommand[] = "edit";
-const char kDefaultChipDbFolder[] = "/usr/share/fpga-icestorm/chipdb";
 
 // How often unsaved work goes to the recovery file.
 constexpr auto kRecoveryInterval = std::chrono::seconds(2);
-
-std::string ChipDbFolder() {
-    const char* folder = std::getenv("VENLOMER_CHIPDB_DIR");
-    return folder != nullptr ? folder : kDefaultChipDbFolder;
-}
 
 int Run(const ParsedArgs& args) {
     EditorFiles files;
@@ -41,17 +35,19 @@ int Run(const ParsedArgs& args) {
     if (files.design.empty() || files.pcf.empty()) {
         return UsageError(kCommand, "--design and --pcf are required");
     }
-    if (args.Has("--chipdb") && args.Has("--device")) {
-        return UsageError(kCommand, "--chipdb and --device name the same thing; give one");
+    std::string error;
+    DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
+    switch (ResolveDevice(request, files.device, error)) {
+    case DeviceResolution::Ok:
+        break;
+    case DeviceResolution::BadUsage:
+        return UsageError(kCommand, error);
+    case DeviceResolution::Missing:
+        return Refused(kCommand, error);
     }
-    if (args.Has("--chipdb")) {
-        files.chipDb = args.Value("--chipdb");
-        files.package = args.Value("--package");
-    } else {
-        std::string device = args.Value("--device", "8k");
-        files.chipDb =
-            (std::filesystem::path(ChipDbFolder()) / ("chipdb-" + device + ".txt")).string();
-        files.package = args.Value("--package", device == "8k" ? "ct256" : "");
+    if (files.device.chipDb == "-") {
+        return UsageError(kCommand, "the editor reads its chip database from a file, not "
+                                    "standard input");
     }
     int port = 0;
     if (args.Has("--port")) {
@@ -72,8 +68,10 @@ int Run(const ParsedArgs& args) {
         return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
                                  "VENLOMER_DATA_PATH to the folder that holds it");
     }
+    if (!files.device.note.empty()) {
+        std::printf("Note: %s\n", files.device.note.c_str());
+    }
     Editor editor;
-    std::string error;
     if (!editor.Open(files, error)) {
         return Refused(kCommand, error);
     }
@@ -130,7 +128,7 @@ int Run(const ParsedArgs& args) {
         }
     });
     std::printf("Editing %s with %s on %s\nOpen %s in a browser; Ctrl-C stops.\n",
-                files.pcf.c_str(), files.design.c_str(), files.chipDb.c_str(),
+                files.pcf.c_str(), files.design.c_str(), files.device.chipDb.c_str(),
                 server.Url().c_str());
     std::fflush(stdout);
 
@@ -166,9 +164,9 @@ const Command& EditCommand() {
          {
              {"--design", "FILE", "yosys JSON netlist of the design (required)"},
              {"--pcf", "FILE", "constraint file to edit; created by the first Save (required)"},
-             {"--chipdb", "FILE", "chip database"},
-             {"--device", "NAME", "chipdb-NAME.txt of the default folder (default: 8k)"},
-             {"--package", "NAME", "package (default: ct256 on the 8k, else the first)"},
+             {"--chipdb", "FILE", "chip database (default: chipdb-8k.txt of fpga-icestorm-chipdb)"},
+             {"--device", "NAME", "chipdb-NAME.txt of the chip-database folder"},
+             {"--package", "NAME", "package whose pins to plan (default: the device's usual)"},
              {"--port", "N", "port to listen on (default: 0, a free port)"},
              {"--recover", "", "load the unsaved changes an earlier session left"},
              {"--discard-recovery", "", "drop the unsaved changes an earlier session left"},

@@ -1,6 +1,7 @@
 //===-- tools/editor/Editor.cpp - the pin-planning editor's engine ----------------===//
 #include "Editor.h"
 
+#include "DeviceModel.h"
 #include "PortHolders.h"
 
 #include "CommonI/RefCountPtr.h"
@@ -116,17 +117,14 @@ std::string PortId(const std::string& name) {
 
 struct Editor::State {
     EditorFiles files;
-    ChipDb db;
+    std::unique_ptr<DeviceModel> device;
+    const ChipDb* dbp = nullptr;
     Design design;
     PcfFile pcf;
-    std::unordered_map<std::string, const Pin*> pinByName;
     std::unique_ptr<PortHolders> ports;
     std::unordered_map<std::string, PortHolder*> portByName;
     Ptr<VnI::ITreeModel> designTree;
-
-    // Declared after every holder they point at, so they let go first.
-    Vn::Eng::SelectionManager selection;
-    Vn::Eng::HighlightManager highlight;
+    mutable DevicePalette palette; // remembers whether it fell back; no plan state
 
     std::vector<PcfFile> undo;
     std::vector<PcfFile> redo;
@@ -138,17 +136,24 @@ struct Editor::State {
     std::vector<std::string> matches; // ids of the last search
 
     ~State() {
-        highlight.RemoveAll();
-        selection.RemoveAll();
+        // The device model's managers may hold port holders, which die before the model.
+        if (device) {
+            device->Highlight().RemoveAll();
+            device->Selection().RemoveAll();
+        }
         designTree = nullptr;
     }
+
+    const ChipDb& db() const { return *dbp; }
+    Vn::Eng::SelectionManager& selection() const { return device->Selection(); }
+    Vn::Eng::HighlightManager& highlight() const { return device->Highlight(); }
 
     // By text, so that undoing back to the saved plan counts as saved.
     bool Unsaved() const { return pcf.Text() != savedText; }
 
     void Recheck() {
-        problems = CheckPins(db, design, files.design, pcf, false);
-        ports->ApplyPins(db, pcf);
+        problems = CheckPins(db(), design, files.design, pcf, false);
+        ports->ApplyPins(db(), pcf);
     }
 
     // The design > bus > bit tree; a one-bit port sits directly under the design.
@@ -191,9 +196,25 @@ struct Editor::State {
 
     // ---- ids ----------------------------------------------------------------------------
 
-    std::string IdOf(VnI::IPropertyHolder* holder) const {
+    // Ids name holders in the page: "port:led[0]", "pin:B5", "bank:0", "tile:IO_4_33",
+    // "device".
+    static std::string IdOf(VnI::IPropertyHolder* holder) {
         if (holder->GetType() == kPortHolderType) {
             return PortId(holder->GetName().str());
+        }
+        auto* resource = dynamic_cast<DeviceHolder*>(holder);
+        if (resource == nullptr) {
+            return "";
+        }
+        switch (resource->GetKind()) {
+        case DeviceHolder::Kind::Pin:
+            return "pin:" + resource->GetName().str();
+        case DeviceHolder::Kind::Bank:
+            return "bank:" + std::to_string(resource->GetIndex());
+        case DeviceHolder::Kind::Tile:
+            return "tile:" + resource->GetName().str();
+        case DeviceHolder::Kind::Device:
+            return "device";
         }
         return "";
     }
@@ -202,6 +223,19 @@ struct Editor::State {
         if (id.rfind("port:", 0) == 0) {
             auto it = portByName.find(id.substr(5));
             return it == portByName.end() ? nullptr : it->second;
+        }
+        if (id.rfind("pin:", 0) == 0) {
+            return device->FindPin(id.substr(4));
+        }
+        if (id.rfind("bank:", 0) == 0) {
+            std::string number = id.substr(5);
+            int bank = -1;
+            auto [end, ec] = std::from_chars(number.data(), number.data() + number.size(), bank);
+            bool whole = ec == std::errc() && end == number.data() + number.size();
+            return whole && bank >= 0 && bank < kBankCount ? device->Bank(bank) : nullptr;
+        }
+        if (id == "device") {
+            return device->Device();
         }
         return nullptr;
     }
@@ -269,8 +303,7 @@ struct Editor::State {
         state["problemPins"] = problemPins;
         state["problemPorts"] = problemPorts;
         json selected = json::array();
-        for (auto it = const_cast<Vn::Eng::SelectionManager&>(selection).GetAllSelectedItems();
-             !it->IsEnd(); it->Next()) {
+        for (auto it = selection().GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
             std::string id = IdOf(it->CurrentItem());
             if (!id.empty()) {
                 selected.push_back(id);
@@ -278,9 +311,72 @@ struct Editor::State {
         }
         state["selected"] = std::move(selected);
         state["matches"] = matches;
+        json lit = json::object();
+        for (auto it = highlight().GetHighlightedItems(); !it->IsEnd(); it->Next()) {
+            VnI::IDeviceResource* resource = it->CurrentItem();
+            auto* holder = static_cast<VnI::IPropertyHolder*>(
+                resource->GetInterface(VnI::IPropertyHolder::kIID));
+            lit[holder->GetName().str()] = palette.Of(resource->GetHighlightColor(), "#ff0000");
+        }
+        state["highlighted"] = std::move(lit);
         // A match is shown in the first selected-path colour, as the pin view rings it.
         state["matchColor"] = ColorHex(Vn::Eng::ColorManager::GetSelectedPathColor(0));
         return state;
+    }
+
+    // What never changes while the editor runs: the grid, the pins and their colours.
+    json DeviceJson() {
+        const ChipDb& chip = db();
+        json tiles = json::array();
+        for (DeviceHolder* tile : device->Tiles()) {
+            int x = 0;
+            int y = 0;
+            tile->GetLocation(x, y);
+            tiles.push_back({{"name", tile->GetName().str()},
+                             {"x", x},
+                             {"y", y},
+                             {"type", tile->GetPropertyByName("Type")->GetStringProperty().str()},
+                             {"site", tile->GetSiteType().str()},
+                             {"color", palette.TileColour(*tile)}});
+        }
+        json pins = json::array();
+        for (DeviceHolder* pin : device->Pins()) {
+            const Pin& record = device->PinOf(pin);
+            pins.push_back({{"id", IdOf(pin)},
+                            {"name", record.name},
+                            {"bank", record.bank},
+                            {"x", record.x},
+                            {"y", record.y},
+                            {"block", record.pio},
+                            {"gbuf", device->IsGlobalBufferPin(pin)},
+                            {"color", palette.BankColour(record.bank)}});
+        }
+        json banks = json::array();
+        for (DeviceHolder* bank : device->Banks()) {
+            int number = bank->GetIndex();
+            banks.push_back({{"id", IdOf(bank)},
+                             {"bank", number},
+                             {"edge", BankEdgeName(number)},
+                             {"pins", device->PinCount(number)},
+                             {"color", palette.BankColour(number)}});
+        }
+        json sites = json::object();
+        for (const char* site : {"SLICE", "TB_IO", "LR_IO", "BRAM"}) {
+            sites[site] = palette.SiteColour(site);
+        }
+        json paths = json::array();
+        for (int path = 0; path < 4; ++path) {
+            paths.push_back(palette.PathColour(path));
+        }
+        return {{"name", chip.device},
+                {"package", chip.package},
+                {"width", chip.width},
+                {"height", chip.height},
+                {"tiles", std::move(tiles)},
+                {"pins", std::move(pins)},
+                {"banks", std::move(banks)},
+                {"sites", std::move(sites)},
+                {"selectedPath", std::move(paths)}};
     }
 
     json TreeNodeJson(const Ptr<VnI::ITreeNode>& node) const {
@@ -304,13 +400,14 @@ struct Editor::State {
 
     json TreeJson() const {
         json roots = json::array();
+        roots.push_back(TreeNodeJson(device->Tree()->GetRootNode()));
         roots.push_back(TreeNodeJson(designTree->GetRootNode()));
         return {{"roots", roots}};
     }
 
     json PropertiesJson() {
         VnI::IPropertyHolder* last = nullptr;
-        for (auto it = selection.GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
+        for (auto it = selection().GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
             last = it->CurrentItem();
         }
         if (last == nullptr) {
@@ -325,9 +422,8 @@ struct Editor::State {
                             {"type", TypeName(property->GetType())},
                             {"value", ValueOf(property)}});
         }
-        return {{"id", IdOf(last)},
-                {"kind", last->GetType() == kPortHolderType ? "port" : "pin"},
-                {"properties", std::move(list)}};
+        std::string id = IdOf(last);
+        return {{"id", id}, {"kind", id.substr(0, id.find(':'))}, {"properties", std::move(list)}};
     }
 
     // ---- changes ------------------------------------------------------------------------
@@ -336,7 +432,7 @@ struct Editor::State {
     template <class Change> void Edit(Change change) {
         PcfFile next = pcf;
         change(next);
-        auto nextProblems = CheckPins(db, design, files.design, next, false);
+        auto nextProblems = CheckPins(db(), design, files.design, next, false);
         std::set<std::string> before;
         for (const PinProblem& p : problems) {
             if (p.severity == PinProblem::Severity::Error) {
@@ -387,7 +483,9 @@ struct Editor::State {
 
     void Save() {
         std::string error;
-        if (!Port::WriteFileSafely(files.pcf, pcf.Text(), error, {files.design, files.chipDb})) {
+        if (!Port::WriteFileSafely(
+                files.pcf, pcf.Text(), error,
+                {files.design, files.device.chipDb, DeviceModel::ColourSchemePath()})) {
             throw Refusal{500, error};
         }
         savedText = pcf.Text();
@@ -461,7 +559,7 @@ struct Editor::State {
 
     void Search(const json& request) {
         if (request.value("clear", false)) {
-            highlight.RemoveAll();
+            highlight().RemoveAll();
             matches.clear();
             return;
         }
@@ -486,21 +584,26 @@ struct Editor::State {
             }
         }
         std::vector<VnI::IPropertyHolder*> found;
+        std::list<VnI::IPropertyHolder*> pinList(device->Pins().begin(), device->Pins().end());
         std::list<VnI::IPropertyHolder*> portList = ports->List();
-        bool any = SearchOver(portList, ports->Names(), property, value, flags, found);
+        bool any = SearchOver(pinList, device->PinNames(), property, value, flags, found);
+        any = SearchOver(portList, ports->Names(), property, value, flags, found) || any;
         if (!any) {
             throw Refusal{400, "pins and ports have no property \"" + property + "\""};
         }
-        highlight.RemoveAll();
+        highlight().RemoveAll();
         matches.clear();
         for (VnI::IPropertyHolder* holder : found) {
             matches.push_back(IdOf(holder));
+            if (auto* pin = dynamic_cast<DeviceHolder*>(holder)) {
+                highlight().AddHighlightedItem(pin->AsResource());
+            }
         }
     }
 
     void Select(const json& request) {
         if (request.value("clear", false)) {
-            selection.RemoveAll();
+            selection().RemoveAll();
             return;
         }
         std::string id = StringField(request, "id");
@@ -511,16 +614,16 @@ struct Editor::State {
         std::string mode = request.value("mode", "replace");
         bool descend = request.value("descend", false);
         if (mode == "replace") {
-            selection.RemoveAll();
-            selection.AddSelectedItem(holder, descend);
+            selection().RemoveAll();
+            selection().AddSelectedItem(holder, descend);
         } else if (mode == "toggle") {
             if (holder->IsSelected()) {
-                selection.RemoveSelectedItem(holder, descend);
+                selection().RemoveSelectedItem(holder, descend);
             } else {
-                selection.AddSelectedItem(holder, descend);
+                selection().AddSelectedItem(holder, descend);
             }
         } else if (mode == "add") {
-            selection.AddSelectedItem(holder, descend);
+            selection().AddSelectedItem(holder, descend);
         } else {
             throw Refusal{400, "mode is replace, toggle or add; got \"" + mode + "\""};
         }
@@ -547,6 +650,10 @@ struct Editor::State {
             want(false);
             return StateJson();
         }
+        if (path == "/api/device") {
+            want(false);
+            return DeviceJson();
+        }
         if (path == "/api/tree") {
             want(false);
             return TreeJson();
@@ -570,8 +677,8 @@ struct Editor::State {
             std::string port = StringField(request, "port");
             std::string pin = StringField(request, "pin");
             PortNamed(port);
-            if (pinByName.count(pin) == 0) {
-                throw Refusal{404, "package " + db.package + " has no pin \"" + pin + "\""};
+            if (device->FindPin(pin) == nullptr) {
+                throw Refusal{404, "package " + db().package + " has no pin \"" + pin + "\""};
             }
             Edit([&](PcfFile& next) { next.Assign(port, pin); });
             return StateJson();
@@ -590,7 +697,7 @@ struct Editor::State {
         if (path == "/api/auto") {
             want(true);
             Edit([&](PcfFile& next) {
-                if (AutoAssign(db, design, next).empty()) {
+                if (AutoAssign(db(), design, next).empty()) {
                     throw Refusal{409, "no port without a pin got one"};
                 }
             });
@@ -620,14 +727,12 @@ bool Editor::Open(const EditorFiles& files, std::string& error) {
     std::lock_guard<std::mutex> hold(m_lock);
     State& s = *m_state;
     s.files = files;
-    if (!ReadChipDbFile(files.chipDb, files.package, s.db, error) ||
-        !ReadYosysPortsFile(files.design, s.design, error) ||
+    s.device = DeviceModel::Open(files.device, error);
+    if (!s.device || !ReadYosysPortsFile(files.design, s.design, error) ||
         !s.pcf.ParseFile(files.pcf, error, true)) {
         return false;
     }
-    for (const Pin& pin : s.db.pins) {
-        s.pinByName.emplace(pin.name, &pin);
-    }
+    s.dbp = &s.device->Db();
     s.ports = std::make_unique<PortHolders>(s.design);
     for (const DesignPort& port : s.design.ports) {
         s.portByName.emplace(port.name, s.ports->Find(port.name));
@@ -686,7 +791,7 @@ bool Editor::WriteRecovery(std::string& error) {
         return true;
     }
     if (!Port::WriteFileSafely(RecoveryPath(), text, error,
-                               {s.files.design, s.files.chipDb, s.files.pcf})) {
+                               {s.files.design, s.files.device.chipDb, s.files.pcf})) {
         return false;
     }
     s.recoveredText = std::move(text);

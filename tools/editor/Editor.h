@@ -45,6 +45,7 @@
 #pragma once
 
 #include "ChipDb.h"
+#include "DeviceOptions.h"
 #include "Pcf.h"
 #include "PinPlan.h"
 #include "YosysPorts.h"
@@ -58,8 +59,7 @@ namespace VnTool {
 struct EditorFiles {
     std::string design;  ///< yosys JSON netlist
     std::string pcf;     ///< constraint file; created by the first save when missing
-    std::string chipDb;  ///< chip database
-    std::string package; ///< empty: the chip database's first
+    DeviceSource device; ///< chip database and package
 };
 
 struct EditorReply {
