@@ -387,7 +387,8 @@ struct Editor::State {
         if (holder != nullptr) {
             out["label"] = holder->GetName().str();
             out["id"] = IdOf(holder);
-        } else if (auto* group = dynamic_cast<Vn::Eng::TreeGroupNode*>(node.Get())) {
+        } else if (auto* group = dynamic_cast<Vn::Eng::TreeGroupNode*>(
+                       Vn::Eng::TreeNode::FromInterface(node.Get()))) {
             out["label"] = group->GetName().str();
         }
         json children = json::array();
@@ -502,7 +503,7 @@ struct Editor::State {
     // The value typed as the schema declares `property`, since a property only equals one
     // of its own type. Null when the schema lacks the name.
     static Ptr<VnI::IProperty> Wanted(VnI::IPropertyNameList* names, const std::string& property,
-                                      const std::string& value, std::vector<Text>& choices) {
+                                      const std::string& value) {
         int position = names->Contains(Text(property.c_str()));
         if (position < 0) {
             return nullptr;
@@ -526,13 +527,7 @@ struct Editor::State {
             return Ptr<VnI::IProperty>::Adopt(
                 Vn::Eng::PropertyFactory::CreateBoolProperty(yes, true));
         }
-        case VnI::ENUM_TYPE: {
-            for (auto it = name->GetPossibleValues(); it && !it->IsEnd(); it->Next()) {
-                choices.push_back(it->CurrentItem());
-            }
-            return Ptr<VnI::IProperty>::Adopt(
-                Vn::Eng::PropertyFactory::CreateEnumProperty(choices, value.c_str(), true));
-        }
+        // An enumerated holder property compares its text with a string's.
         default:
             return Ptr<VnI::IProperty>::Adopt(
                 Vn::Eng::PropertyFactory::CreateStringProperty(value.c_str(), true));
@@ -543,8 +538,7 @@ struct Editor::State {
     static bool SearchOver(std::list<VnI::IPropertyHolder*>& holders, VnI::IPropertyNameList* names,
                            const std::string& property, const std::string& value, int flags,
                            std::vector<VnI::IPropertyHolder*>& found) {
-        std::vector<Text> choices; // outlives `wanted`, which refers to it
-        Ptr<VnI::IProperty> wanted = Wanted(names, property, value, choices);
+        Ptr<VnI::IProperty> wanted = Wanted(names, property, value);
         if (!wanted) {
             return false;
         }
