@@ -11,14 +11,33 @@
 
 #include <atomic>
 #include <cstdlib>
+#include <malloc.h>
 #include <new>
 
 namespace {
 std::atomic<std::uint64_t> g_bytes{0};
+// What the heap holds for the program now, as malloc counts it (its rounding included).
+std::atomic<std::int64_t> g_live{0};
+
+void* Counted(void* p) {
+    if (p != nullptr) {
+        g_live.fetch_add(static_cast<std::int64_t>(malloc_usable_size(p)),
+                         std::memory_order_relaxed);
+    }
+    return p;
+}
+
+void Free(void* p) {
+    if (p != nullptr) {
+        g_live.fetch_sub(static_cast<std::int64_t>(malloc_usable_size(p)),
+                         std::memory_order_relaxed);
+        std::free(p);
+    }
+}
 
 void* Allocate(std::size_t size) {
     g_bytes.fetch_add(size, std::memory_order_relaxed);
-    if (void* p = std::malloc(size == 0 ? 1 : size)) {
+    if (void* p = Counted(std::malloc(size == 0 ? 1 : size))) {
         return p;
     }
     throw std::bad_alloc();
@@ -29,6 +48,10 @@ std::uint64_t VnBench::AllocatedBytes() {
     return g_bytes.load(std::memory_order_relaxed);
 }
 
+std::int64_t VnBench::LiveBytes() {
+    return g_live.load(std::memory_order_relaxed);
+}
+
 void* operator new(std::size_t size) {
     return Allocate(size);
 }
@@ -37,27 +60,27 @@ void* operator new[](std::size_t size) {
 }
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
     g_bytes.fetch_add(size, std::memory_order_relaxed);
-    return std::malloc(size == 0 ? 1 : size);
+    return Counted(std::malloc(size == 0 ? 1 : size));
 }
 void* operator new[](std::size_t size, const std::nothrow_t&) noexcept {
     g_bytes.fetch_add(size, std::memory_order_relaxed);
-    return std::malloc(size == 0 ? 1 : size);
+    return Counted(std::malloc(size == 0 ? 1 : size));
 }
 void operator delete(void* p) noexcept {
-    std::free(p);
+    Free(p);
 }
 void operator delete[](void* p) noexcept {
-    std::free(p);
+    Free(p);
 }
 void operator delete(void* p, std::size_t) noexcept {
-    std::free(p);
+    Free(p);
 }
 void operator delete[](void* p, std::size_t) noexcept {
-    std::free(p);
+    Free(p);
 }
 void operator delete(void* p, const std::nothrow_t&) noexcept {
-    std::free(p);
+    Free(p);
 }
 void operator delete[](void* p, const std::nothrow_t&) noexcept {
-    std::free(p);
+    Free(p);
 }

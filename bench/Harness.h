@@ -26,6 +26,8 @@ const Sizes& GetSizes();
 /// Bytes handed out by operator new since the process started (the benchmark program
 /// replaces the global operator new to count them).
 std::uint64_t AllocatedBytes();
+/// Bytes the heap holds for operator new's blocks now, as malloc rounds them.
+std::int64_t LiveBytes();
 
 /// The sixteen property names the look-up measurements use, ours and the baselines alike.
 std::vector<std::string> SixteenNames();

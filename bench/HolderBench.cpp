@@ -4,6 +4,7 @@
 #include "VnI/ITreeNode.h"
 #include "s/DeviceResource.h"
 #include "s/FindItr.h"
+#include "s/GenericPropertyHolder.h"
 #include "s/PropertyFactory.h"
 #include "s/PropertyHolderItr.h"
 #include "s/PropertyNameList.h"
@@ -207,6 +208,54 @@ void CountedCopy(benchmark::State& state) {
     SetItems(state, 1);
 }
 
+// Generic holders of sixteen int properties each, built and let go, a thousand per
+// iteration: the same work as the bag baseline.
+void BuildGeneric(benchmark::State& state) {
+    std::vector<Str> names;
+    for (const std::string& text : SixteenNames()) {
+        names.emplace_back(text);
+    }
+    const size_t count = GetSizes().holders;
+    for (auto _ : state) {
+        std::vector<std::unique_ptr<Vn::Eng::GenericPropertyHolder>> holders;
+        holders.reserve(count);
+        for (size_t h = 0; h < count; ++h) {
+            holders.push_back(std::make_unique<Vn::Eng::GenericPropertyHolder>());
+            for (int i = 0; i < 16; ++i) {
+                holders.back()->AddProperty(names[static_cast<size_t>(i)], Int(i));
+            }
+        }
+        benchmark::DoNotOptimize(holders.data());
+    }
+    SetItems(state, count);
+}
+
+// Heap bytes one generic holder with sixteen int properties holds, the properties
+// included, as malloc rounds them.
+void GenericBytes(benchmark::State& state) {
+    std::vector<Str> names;
+    for (const std::string& text : SixteenNames()) {
+        names.emplace_back(text);
+    }
+    for (auto _ : state) {
+        const std::int64_t before = LiveBytes();
+        std::vector<RefCountPtr<VnI::IProperty>> properties;
+        properties.reserve(16);
+        const std::int64_t vectorBytes = LiveBytes() - before;
+        for (int i = 0; i < 16; ++i) {
+            properties.push_back(Int(i));
+        }
+        const std::int64_t propertyBytes = LiveBytes() - before - vectorBytes;
+        auto holder = std::make_unique<Vn::Eng::GenericPropertyHolder>();
+        for (int i = 0; i < 16; ++i) {
+            holder->AddProperty(names[static_cast<size_t>(i)], properties[static_cast<size_t>(i)]);
+        }
+        state.counters["bytes_per_object"] =
+            static_cast<double>(LiveBytes() - before - vectorBytes);
+        state.counters["property_bytes"] = static_cast<double>(propertyBytes);
+    }
+}
+
 // Builds a tree of `count` nodes below a root (siblings, or a chain), walks it, copies it
 // deeply and lets both go.
 void Tree(benchmark::State& state, size_t count, bool chain) {
@@ -248,6 +297,8 @@ void RegisterHolderBenchmarks() {
     PerCall(benchmark::RegisterBenchmark("reference/counted_copy", CountedCopy));
     PerCall(benchmark::RegisterBenchmark("reference/position_only", LookupPositionOnly));
     benchmark::RegisterBenchmark("bytes/ours", Bytes)->Iterations(1);
+    benchmark::RegisterBenchmark("bytes/generic_16", GenericBytes)->Iterations(1);
+    PerCall(benchmark::RegisterBenchmark("generic/build_ours_16", BuildGeneric));
     benchmark::RegisterBenchmark("search_int/finditr", Search, "X", Int(500), VnI::MATCH_EXACT)
         ->Iterations(repeat);
     benchmark::RegisterBenchmark("search_int/hand_loop", HandLoop)->Iterations(repeat);

@@ -8,6 +8,7 @@
 #include "s/SelectionManager.h"
 
 #include <algorithm>
+#include <list>
 #include <memory>
 #include <numeric>
 #include <random>
@@ -102,6 +103,94 @@ void HighlightThenRemove(benchmark::State& state, size_t count) {
     SetItems(state, count);
 }
 
+// Selects `count` holders into a new manager: the cost of a first selection, first
+// touches of new memory included. Letting the selection go is not timed.
+void SelectFromEmpty(benchmark::State& state, size_t count) {
+    std::vector<MinimalResource> holders(count);
+    for (auto _ : state) {
+        auto manager = std::make_unique<Vn::Eng::SelectionManager>();
+        for (auto& h : holders) {
+            manager->AddSelectedItem(&h, false);
+        }
+        state.PauseTiming();
+        manager.reset();
+        state.ResumeTiming();
+    }
+    SetItems(state, count);
+}
+
+// Live heap bytes of a manager holding `count` items, lists and index together.
+template <class Fill> std::int64_t ManagerBytes(size_t count, Fill&& fill) {
+    std::vector<MinimalResource> items(count);
+    const std::int64_t before = LiveBytes();
+    return fill(items) - before;
+}
+
+std::int64_t ListBytes(size_t count, int lists) {
+    std::vector<int> items(count);
+    const std::int64_t before = LiveBytes();
+    std::vector<std::list<int*>> all(static_cast<size_t>(lists));
+    for (auto& list : all) {
+        for (int& item : items) {
+            list.push_back(&item);
+        }
+    }
+    return LiveBytes() - before;
+}
+
+std::int64_t SelectionBytes(size_t count) {
+    return ManagerBytes(count, [](std::vector<MinimalResource>& holders) {
+        Vn::Eng::SelectionManager manager;
+        for (auto& h : holders) {
+            manager.AddSelectedItem(&h, false);
+        }
+        return LiveBytes();
+    });
+}
+
+std::int64_t HighlightBytes(size_t count) {
+    return ManagerBytes(count, [](std::vector<MinimalResource>& resources) {
+        Vn::Eng::HighlightManager manager;
+        for (auto& r : resources) {
+            manager.AddHighlightedItem(&r);
+        }
+        return LiveBytes();
+    });
+}
+
+// The sizes a table is sparsest at (one past 3/4 of a power of two) and round ones.
+std::vector<size_t> SweepSizes() {
+    const size_t large = GetSizes().large;
+    std::vector<size_t> sizes{GetSizes().small, large};
+    for (size_t power = 1024; power * 3 / 4 < large; power *= 2) {
+        sizes.push_back(power * 3 / 4 + 1);
+    }
+    return sizes;
+}
+
+// Index bytes per item in the manager's lists: the manager's bytes less those of as many
+// bare lists, the worst over the sizes swept. The selection lists each holder twice.
+void IndexBytesPerListedItem(benchmark::State& state, bool selection) {
+    for (auto _ : state) {
+        double worst = 0;
+        for (size_t count : SweepSizes()) {
+            const int lists = selection ? 2 : 1;
+            const std::int64_t manager = selection ? SelectionBytes(count) : HighlightBytes(count);
+            const double perItem = static_cast<double>(manager - ListBytes(count, lists)) /
+                                   static_cast<double>(count * static_cast<size_t>(lists));
+            worst = std::max(worst, perItem);
+        }
+        state.counters["bytes_per_object"] = worst;
+    }
+}
+
+void BytesPerSelectedHolder(benchmark::State& state) {
+    for (auto _ : state) {
+        state.counters["bytes_per_object"] = static_cast<double>(SelectionBytes(GetSizes().large)) /
+                                             static_cast<double>(GetSizes().large);
+    }
+}
+
 // A view colours every tile it draws by its type name; a known name must cost no more
 // than one lookup in a hash map. The name is copied per call, as the by-value signature
 // makes every caller do.
@@ -132,6 +221,16 @@ void RegisterLibraryBenchmarks() {
     benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large)
         ->Iterations(repeat);
     PerCall(benchmark::RegisterBenchmark("colour/GetTileSiteColor", TileSiteColour));
+    benchmark::RegisterBenchmark("select_from_empty/small", SelectFromEmpty, sizes.small)
+        ->Iterations(repeat * 10);
+    benchmark::RegisterBenchmark("select_from_empty/large", SelectFromEmpty, sizes.large)
+        ->Iterations(1);
+    benchmark::RegisterBenchmark("bytes/selection_index_per_listed", IndexBytesPerListedItem, true)
+        ->Iterations(1);
+    benchmark::RegisterBenchmark("bytes/highlight_index_per_listed", IndexBytesPerListedItem, false)
+        ->Iterations(1);
+    benchmark::RegisterBenchmark("bytes/selection_per_holder", BytesPerSelectedHolder)
+        ->Iterations(1);
 }
 
 } // namespace VnBench

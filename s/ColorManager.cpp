@@ -173,11 +173,29 @@ GrowingPalette ClockRegions() {
 
 // Appends fresh copies of the repeated defaults until the palette holds `length`
 // colours. Callers make sure there are defaults to repeat.
-void GrowTo(const GrowingPalette& palette, std::size_t length) {
-    palette.working.reserve(length);
+// Grows the palette to length colours repeating the defaults, then appends last when it
+// is given. All or nothing: every copy is made and the room reserved before the palette
+// changes, so a failed allocation leaves it as it was (and never holds a null colour).
+// False when a copy could not be made.
+bool GrowTo(const GrowingPalette& palette, std::size_t length, const Color& last = nullptr) {
+    ColorList added;
+    added.reserve(length - palette.working.size() + (last ? 1 : 0));
     for (std::size_t i = palette.working.size(); i < length; ++i) {
-        palette.working.push_back(CopyOf(palette.defaults[i % palette.defaults.size()]));
+        added.push_back(CopyOf(palette.defaults[i % palette.defaults.size()]));
     }
+    if (last) {
+        added.push_back(CopyOf(last));
+    }
+    for (const Color& color : added) {
+        if (!color) {
+            return false;
+        }
+    }
+    palette.working.reserve(palette.working.size() + added.size());
+    for (Color& color : added) {
+        palette.working.push_back(std::move(color)); // room reserved: cannot fail
+    }
+    return true;
 }
 
 Color GetGrowing(const GrowingPalette& palette, int index, bool fromDefault) {
@@ -201,7 +219,11 @@ Color GetGrowing(const GrowingPalette& palette, int index, bool fromDefault) {
                                    palette.label, index, ColorManager::kMaxPaletteLength);
         return nullptr;
     }
-    GrowTo(palette, position + 1);
+    if (!GrowTo(palette, position + 1)) {
+        Port_MsgManData::debugStub("%s color %d: out of memory growing the palette\n",
+                                   palette.label, index);
+        return nullptr;
+    }
     return palette.working[position];
 }
 
@@ -227,10 +249,13 @@ bool SetGrowing(const GrowingPalette& palette, unsigned int index, Color color) 
             index);
         return false;
     }
-    GrowTo(palette, index);
     // Beyond the old length the palette keeps a copy: the caller's later changes to its
     // own object do not reach it.
-    palette.working.push_back(CopyOf(color));
+    if (!GrowTo(palette, index, color)) {
+        Port_MsgManData::debugStub("Failed to set %s color %u: out of memory\n", palette.label,
+                                   index);
+        return false;
+    }
     return true;
 }
 

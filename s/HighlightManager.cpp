@@ -8,6 +8,7 @@
 
 #include "s/internal/PointerIndex.h"
 
+#include <cstdint>
 #include <deque>
 #include <memory>
 
@@ -33,20 +34,67 @@ public:
     std::int64_t RemoveAll() override { return m_owner->RemoveAll(); }
 };
 
-// The entries of one resource. Entries are only ever appended at the list's end and
-// removed oldest first, so a queue keeps them in order; the oldest sits in the index
-// itself, and only a resource highlighted more than once needs the queue.
+// The entries of a resource highlighted more than once. Entries are only ever appended
+// at the list's end and removed oldest first, so a queue keeps them in order.
 struct Entries {
+    VnI::IDeviceResource* resource;
     List::iterator oldest;
-    std::unique_ptr<std::deque<List::iterator>> later;
+    std::deque<List::iterator> later;
 };
+
+// One resource in the index, in eight bytes: the list node of its only entry with 16
+// bits of its address's hash above the node's address (the node holds the resource,
+// read only when the bits match), or, with the low bit set, its Entries.
+class Slot {
+public:
+    using Bits = detail::IteratorBits<List::iterator>;
+
+    bool Empty() const { return m_bits == 0; }
+    bool Boxed() const { return (m_bits & 1) != 0; }
+    Entries* Box() const { return reinterpret_cast<Entries*>(m_bits & ~std::uint64_t{1}); }
+    List::iterator Only() const { return Bits::From(m_bits); }
+    const VnI::IDeviceResource* KeyOf() const { return Boxed() ? Box()->resource : *Only(); }
+    bool Holds(const VnI::IDeviceResource* key, std::uint64_t hash) const {
+        if (Boxed()) {
+            return Box()->resource == key;
+        }
+        return (m_bits >> 48) == (hash >> 48) && *Only() == key;
+    }
+
+    /// False when at cannot be packed; the slot is left as it was.
+    bool SetOnly(List::iterator at, std::uint64_t hash) {
+        if (!Bits::Packs(at)) {
+            return false;
+        }
+        m_bits = Bits::Of(at) | (hash & ~std::uint64_t{0} << 48);
+        return true;
+    }
+    void SetBox(Entries* box) { m_bits = reinterpret_cast<std::uintptr_t>(box) | 1; }
+
+private:
+    std::uint64_t m_bits = 0;
+};
+static_assert(sizeof(Slot) == 8);
+
+using Index = detail::PointerIndex<VnI::IDeviceResource, Slot>;
 
 struct Record {
     explicit Record(HighlightManager* owner) : m_interface(owner) {}
+    ~Record() { FreeBoxes(); }
+    Record(const Record&) = delete;
+    Record& operator=(const Record&) = delete;
+
+    void FreeBoxes() {
+        m_index.ForEach([](Slot& slot) {
+            if (slot.Boxed()) {
+                delete slot.Box();
+            }
+        });
+    }
 
     List m_highlightedItems;
     HighlightManager_IHighlightManager m_interface;
-    detail::PointerIndex<VnI::IDeviceResource, Entries> m_index;
+    Index m_index;
 };
 
 } // namespace HighlightManagerImp
@@ -77,13 +125,28 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     HighlightManagerImp::List staged;
     staged.push_back(resource);
     const HighlightManagerImp::List::iterator at = staged.begin();
-    if (HighlightManagerImp::Entries* entries = m_imp->m_index.Find(resource)) {
-        if (!entries->later) {
-            entries->later = std::make_unique<std::deque<HighlightManagerImp::List::iterator>>();
+    using HighlightManagerImp::Entries;
+    auto& index = m_imp->m_index;
+    const std::uint64_t hash = HighlightManagerImp::Index::Hash(resource);
+    if (HighlightManagerImp::Slot* slot = index.Find(resource)) {
+        if (slot->Boxed()) {
+            slot->Box()->later.push_back(at);
+        } else {
+            auto box = std::make_unique<Entries>(Entries{resource, slot->Only(), {at}});
+            slot->SetBox(box.release());
         }
-        entries->later->push_back(at);
     } else {
-        m_imp->m_index.FindOrAdd(resource).oldest = at;
+        // A node that cannot be packed (never seen on the platforms we build for) is kept
+        // in a box of its own.
+        auto box = HighlightManagerImp::Slot::Bits::Packs(at)
+                       ? nullptr
+                       : std::make_unique<Entries>(Entries{resource, at, {}});
+        HighlightManagerImp::Slot& added = index.Add(resource);
+        if (box) {
+            added.SetBox(box.release());
+        } else {
+            added.SetOnly(at, hash);
+        }
     }
     auto& list = m_imp->m_highlightedItems;
     list.splice(list.end(), staged);
@@ -92,17 +155,24 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
 }
 
 std::int64_t HighlightManager::RemoveHighlightedItem(VnI::IDeviceResource* resource) {
-    HighlightManagerImp::Entries* entries = resource ? m_imp->m_index.Find(resource) : nullptr;
-    if (entries == nullptr) {
+    HighlightManagerImp::Slot* slot = resource ? m_imp->m_index.Find(resource) : nullptr;
+    if (slot == nullptr) {
         return 1;
     }
     resource->SetHighlighted(false);
+    if (!slot->Boxed()) {
+        m_imp->m_highlightedItems.erase(slot->Only());
+        m_imp->m_index.Erase(slot);
+        return 1;
+    }
+    HighlightManagerImp::Entries* entries = slot->Box();
     m_imp->m_highlightedItems.erase(entries->oldest);
-    if (entries->later && !entries->later->empty()) {
-        entries->oldest = entries->later->front();
-        entries->later->pop_front();
+    if (!entries->later.empty()) {
+        entries->oldest = entries->later.front();
+        entries->later.pop_front();
     } else {
-        m_imp->m_index.Erase(resource);
+        delete entries;
+        m_imp->m_index.Erase(slot);
     }
     return 1;
 }
@@ -112,6 +182,7 @@ std::int64_t HighlightManager::RemoveAll() {
         resource->SetHighlighted(false);
     }
     m_imp->m_highlightedItems.clear();
+    m_imp->FreeBoxes();
     m_imp->m_index.Clear();
     return 1;
 }

@@ -9,6 +9,7 @@
 #include "s/internal/Shapes.h"
 
 #include <cstdint>
+#include <new>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -135,22 +136,41 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
     if (other == nullptr) {
         return 1;
     }
-    // Walking by position means names this call appends (when other is this list itself)
-    // can never invalidate the walk; they are skipped as already present anyway.
     const auto names = other->GetNameItr();
     if (!names) {
         return 1;
     }
+    // All or nothing: the names are appended to copies of the vector and the index, which
+    // replace them only once every name is in, so a failure part way leaves the list as it
+    // was. Walking by position means names this call appends (when other is this list
+    // itself) can never invalidate the walk; they are skipped as already present anyway.
+    PropertyNameItr::Names staged = m_imp->names;
+    detail::NameIndex index = m_imp->m_nameIndex;
+    std::int32_t visible = m_imp->m_numVisibleNames;
     for (names->First(); !names->IsEnd(); names->Next()) {
         VnI::IPropertyName* name = names->CurrentItem();
         if (name == nullptr) {
             continue;
         }
         const Port::StringBase<char> text = name->GetName();
-        if (Contains(text) == -1) {
-            AddEnumName(text, name->GetType(), name->GetPossibleValues(), name->IsVisible());
+        if (index.Find(text.view()) != -1) {
+            continue;
         }
+        const VnI::PropertyType type = name->GetType();
+        const auto values = name->GetPossibleValues();
+        auto created = PropertyName::CreateInstance(text, type, values, name->IsVisible());
+        // A name that could not be made, or an enumerated one whose values could not be
+        // read, fails the whole call rather than going in wrong or not at all.
+        if (!created || (type == VnI::ENUM_TYPE && !values)) {
+            throw std::bad_alloc(); // a name skipped would shift every later position
+        }
+        staged.push_back(std::move(created));
+        index.Append(text.view());
+        visible += name->IsVisible() ? 1 : 0;
     }
+    m_imp->names.swap(staged);
+    m_imp->m_nameIndex.Swap(index);
+    m_imp->m_numVisibleNames = visible;
     return 1;
 }
 

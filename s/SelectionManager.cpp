@@ -9,6 +9,7 @@
 
 #include "s/internal/PointerIndex.h"
 
+#include <cstdint>
 #include <deque>
 #include <memory>
 #include <new>
@@ -52,40 +53,110 @@ struct Entry {
     bool Used() const { return hasCategory || hasAll; }
 };
 
-// Where one holder stands. A holder is normally selected once, and that entry lives in
-// the index itself; it can stand more often only when a host cleared its flag by hand
-// and selected it again, and only then is the spill vector allocated.
+// Where a holder stands when it needs more than one plain entry: it was selected again
+// after a host cleared its flag by hand, or its entry is part taken.
 struct Positions {
+    VnI::IPropertyHolder* holder;
     Entry first;
-    std::unique_ptr<std::vector<Entry>> more; // later selections, oldest first
+    std::vector<Entry> more; // later selections, oldest first
 
     template <class F> void ForEach(F&& f) {
         f(first);
-        if (more) {
-            for (Entry& e : *more) {
-                f(e);
-            }
+        for (Entry& e : more) {
+            f(e);
         }
     }
     // Keeps the oldest entry still in use in `first`; false when none is left.
     bool Normalize() {
-        while (!first.Used() && more && !more->empty()) {
-            first = more->front();
-            more->erase(more->begin());
+        while (!first.Used() && !more.empty()) {
+            first = more.front();
+            more.erase(more.begin());
         }
         return first.Used();
     }
 };
 
+// One holder in the index, in sixteen bytes. A holder selected once keeps its two list
+// nodes here, each beside 16 bits: the category's low 16 bits above the overall node,
+// its high 4 bits and 12 bits of the address's hash above the category node (a node
+// holds the holder, read only when the hash bits match). Any other holder has its
+// Positions, marked by the low bit of the first word.
+class Slot {
+public:
+    using Bits = detail::IteratorBits<List::iterator>;
+
+    bool Empty() const { return m_all == 0; }
+    bool Boxed() const { return (m_all & 1) != 0; }
+    Positions* Box() const { return reinterpret_cast<Positions*>(m_all & ~std::uint64_t{1}); }
+    Entry Only() const {
+        const auto category = static_cast<int>((m_all >> 48) | ((m_inCategory >> 48) & 0xF) << 16);
+        return Entry{category, Bits::From(m_inCategory), Bits::From(m_all), true, true};
+    }
+    const VnI::IPropertyHolder* KeyOf() const {
+        return Boxed() ? Box()->holder : *Bits::From(m_all);
+    }
+    bool Holds(const VnI::IPropertyHolder* key, std::uint64_t hash) const {
+        if (Boxed()) {
+            return Box()->holder == key;
+        }
+        return (m_inCategory >> 52) == (hash >> 52) && *Bits::From(m_all) == key;
+    }
+
+    /// Whether a whole entry packs into a slot.
+    static bool Packs(const Entry& e) {
+        return e.hasCategory && e.hasAll && e.category >= 0 && e.category < (1 << 20) &&
+               Bits::Packs(e.inCategory) && Bits::Packs(e.inAll);
+    }
+    void SetOnly(const Entry& e, std::uint64_t hash) {
+        const auto category = static_cast<std::uint64_t>(e.category);
+        m_all = Bits::Of(e.inAll) | category << 48;
+        m_inCategory = Bits::Of(e.inCategory) | (category >> 16) << 48 | (hash >> 52) << 52;
+    }
+    void SetBox(Positions* box) {
+        m_all = reinterpret_cast<std::uintptr_t>(box) | 1;
+        m_inCategory = 0;
+    }
+
+private:
+    std::uint64_t m_all = 0;
+    std::uint64_t m_inCategory = 0;
+};
+static_assert(sizeof(Slot) == 16);
+static_assert(SelectionManager::kMaxCategories <= (1 << 20), "a category packs into 20 bits");
+
+using Index = detail::PointerIndex<VnI::IPropertyHolder, Slot>;
+
 struct Record {
     explicit Record(SelectionManager* owner) : m_selectedItems(12), m_interface(owner) {}
+    ~Record() { FreeBoxes(); }
+    Record(const Record&) = delete;
+    Record& operator=(const Record&) = delete;
 
     // A deque keeps each category list where it is when categories are added, so
     // iterators handed out over one category survive another category's creation.
     std::deque<List> m_selectedItems;
     List m_allSelectedItems;
     SelectionManager_ISelectionManager m_interface;
-    detail::PointerIndex<VnI::IPropertyHolder, Positions> m_index;
+    Index m_index;
+
+    void FreeBoxes() {
+        m_index.ForEach([](Slot& slot) {
+            if (slot.Boxed()) {
+                delete slot.Box();
+            }
+        });
+    }
+    // Takes the entry out of the index once its holder has no entry left in any list.
+    void Forget(Slot* slot) {
+        if (slot->Boxed()) {
+            delete slot->Box();
+        }
+        m_index.Erase(slot);
+    }
+    void EraseEntry(const Entry& e) {
+        m_selectedItems[static_cast<size_t>(e.category)].erase(e.inCategory);
+        m_allSelectedItems.erase(e.inAll);
+    }
 
     // Files holder under its type unless it is null, refused or already flagged.
     // True when it was selected now (so its subtree is to be visited).
@@ -129,14 +200,24 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
     inCategory.push_back(holder);
     inAll.push_back(holder);
     const Entry entry{type, inCategory.begin(), inAll.begin(), true, true};
-    Positions& at = m_index.FindOrAdd(holder);
-    if (!at.first.Used()) {
-        at.first = entry;
-    } else {
-        if (!at.more) {
-            at.more = std::make_unique<std::vector<Entry>>();
+    if (Slot* slot = m_index.Find(holder)) {
+        if (slot->Boxed()) {
+            slot->Box()->more.push_back(entry);
+        } else {
+            auto box = std::make_unique<Positions>(Positions{holder, slot->Only(), {entry}});
+            slot->SetBox(box.release());
         }
-        at.more->push_back(entry);
+    } else {
+        // An entry that cannot be packed (never seen on the platforms we build for) is
+        // kept in a box of its own.
+        auto box = Slot::Packs(entry) ? nullptr
+                                      : std::make_unique<Positions>(Positions{holder, entry, {}});
+        Slot& added = m_index.Add(holder);
+        if (box) {
+            added.SetBox(box.release());
+        } else {
+            added.SetOnly(entry, Index::Hash(holder));
+        }
     }
     List& category = m_selectedItems[static_cast<size_t>(type)];
     category.splice(category.end(), inCategory);
@@ -147,17 +228,22 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
 
 void Record::UnselectNewest() {
     VnI::IPropertyHolder* holder = m_allSelectedItems.back();
-    Positions* at = m_index.Find(holder);
-    Entry& newest = at->more && !at->more->empty() ? at->more->back() : at->first;
-    m_selectedItems[static_cast<size_t>(newest.category)].erase(newest.inCategory);
-    m_allSelectedItems.erase(newest.inAll);
-    if (&newest == &at->first) {
-        newest = Entry();
-        if (!at->Normalize()) {
-            m_index.Erase(holder);
-        }
+    Slot* slot = m_index.Find(holder);
+    if (!slot->Boxed()) {
+        EraseEntry(slot->Only());
+        m_index.Erase(slot);
     } else {
-        at->more->pop_back();
+        Positions* at = slot->Box();
+        if (!at->more.empty()) {
+            EraseEntry(at->more.back());
+            at->more.pop_back();
+        } else {
+            EraseEntry(at->first);
+            at->first = Entry();
+            if (!at->Normalize()) {
+                Forget(slot);
+            }
+        }
     }
     holder->SetSelected(false);
 }
@@ -201,11 +287,15 @@ void Record::SelectWithChildren(VnI::IPropertyHolder* holder, bool withChildren)
 
 void Record::Unselect(VnI::IPropertyHolder* holder) {
     const int type = holder->GetType();
-    Positions* at = m_index.Find(holder);
+    Slot* slot = m_index.Find(holder);
     bool listed = false;
-    if (at != nullptr && type >= 0 && static_cast<size_t>(type) < m_selectedItems.size()) {
-        at->ForEach(
-            [&](const Entry& e) { listed = listed || (e.hasCategory && e.category == type); });
+    if (slot != nullptr && type >= 0 && static_cast<size_t>(type) < m_selectedItems.size()) {
+        if (slot->Boxed()) {
+            slot->Box()->ForEach(
+                [&](const Entry& e) { listed = listed || (e.hasCategory && e.category == type); });
+        } else {
+            listed = slot->Only().category == type;
+        }
     }
     if (!listed) {
         // Only a note for the developer: losing it to a failed allocation must not stop a
@@ -217,6 +307,12 @@ void Record::Unselect(VnI::IPropertyHolder* holder) {
         return;
     }
     holder->SetSelected(false);
+    if (!slot->Boxed()) {
+        EraseEntry(slot->Only());
+        m_index.Erase(slot);
+        return;
+    }
+    Positions* at = slot->Box();
     List& category = m_selectedItems[static_cast<size_t>(type)];
     // Out of its category wholly, out of the overall list once (its oldest place).
     bool allTaken = false;
@@ -232,7 +328,7 @@ void Record::Unselect(VnI::IPropertyHolder* holder) {
         }
     });
     if (!at->Normalize()) {
-        m_index.Erase(holder);
+        Forget(slot);
     }
 }
 
@@ -315,6 +411,7 @@ std::int64_t SelectionManager::RemoveAll() {
         category.clear();
     }
     m_imp->m_allSelectedItems.clear();
+    m_imp->FreeBoxes();
     m_imp->m_index.Clear();
     return 1;
 }

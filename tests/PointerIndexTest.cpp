@@ -13,8 +13,24 @@
 
 namespace {
 
-using Index = Vn::Eng::detail::PointerIndex<int, int>;
-constexpr std::size_t kCapacity = 64; // the first table; it holds up to 32 keys
+using Index = Vn::Eng::detail::PointerIndex<int, Vn::Eng::detail::KeyedSlot<int, int>>;
+constexpr std::size_t kCapacity = 64; // reserved by each test; it holds up to 48 keys
+
+// The value stored for key, added as 0 when absent.
+int& FindOrAdd(Index& index, const int* key) {
+    if (auto* slot = index.Find(key)) {
+        return slot->value;
+    }
+    auto& slot = index.Add(key);
+    slot.key = key;
+    return slot.value;
+}
+
+void Erase(Index& index, const int* key) {
+    auto* slot = index.Find(key);
+    ASSERT_NE(slot, nullptr);
+    index.Erase(slot);
+}
 
 // Addresses of a pool, filed by the home slot the index computes for them.
 class KeysByHome {
@@ -46,10 +62,10 @@ void ExpectHolds(Index& index, const std::map<const int*, int>& model,
                  const std::vector<const int*>& gone) {
     ASSERT_EQ(index.Capacity(), kCapacity) << "the table grew: collisions were not tested";
     for (const auto& [key, value] : model) {
-        const int* found = index.Find(key);
+        const auto* found = index.Find(key);
         ASSERT_NE(found, nullptr) << "key " << key << " with home " << Index::HomeIn(key, kCapacity)
                                   << " is unreachable";
-        EXPECT_EQ(*found, value);
+        EXPECT_EQ(found->value, value);
     }
     for (const int* key : gone) {
         EXPECT_EQ(index.Find(key), nullptr) << "erased key " << key << " is still found";
@@ -64,7 +80,7 @@ std::vector<const int*> AddWithHomes(Index& index, KeysByHome& keys,
     for (std::size_t home : homes) {
         const int* key = keys.Take(home);
         const int value = static_cast<int>(model.size()) + 1;
-        index.FindOrAdd(key) = value;
+        FindOrAdd(index, key) = value;
         model[key] = value;
         added.push_back(key);
     }
@@ -79,28 +95,48 @@ TEST(PointerIndex, StartsEmptyAndAddsEachKeyOnce) {
     EXPECT_EQ(index.Capacity(), 0u);
     const int* a = keys.Take(5);
     EXPECT_EQ(index.Find(a), nullptr);
-    index.FindOrAdd(a) = 7;
-    EXPECT_EQ(index.Capacity(), kCapacity);
-    index.FindOrAdd(a) += 1; // found, not added again
+    FindOrAdd(index, a) = 7;
+    EXPECT_EQ(index.Capacity(), 2u);
+    FindOrAdd(index, a) += 1; // found, not added again
     ASSERT_NE(index.Find(a), nullptr);
-    EXPECT_EQ(*index.Find(a), 8);
-    index.Erase(a);
+    EXPECT_EQ(index.Find(a)->value, 8);
+    EXPECT_EQ(index.Size(), 1u);
+    Erase(index, a);
     EXPECT_EQ(index.Find(a), nullptr);
-    index.FindOrAdd(a) = 1;
+    FindOrAdd(index, a) = 1;
     index.Clear();
     EXPECT_EQ(index.Find(a), nullptr);
+    EXPECT_EQ(index.Bytes(), 0u);
+}
+
+// The table's bytes per key stay within 8/3 of a slot at every size it passes through, so
+// a manager's index costs a bounded number of bytes per listed item however many there
+// are; and every key stays reachable across the growths.
+TEST(PointerIndex, StaysBetweenThreeEighthsAndThreeQuartersFullAsItGrows) {
+    std::vector<int> pool(5000);
+    Index index;
+    for (std::size_t n = 1; n <= pool.size(); ++n) {
+        FindOrAdd(index, &pool[n - 1]) = static_cast<int>(n);
+        ASSERT_LE(index.Capacity() * 3, n * 8) << "too sparse at " << n << " keys";
+        ASSERT_LE(n * 4, index.Capacity() * 3) << "too full at " << n << " keys";
+    }
+    for (std::size_t i = 0; i < pool.size(); ++i) {
+        ASSERT_NE(index.Find(&pool[i]), nullptr) << i;
+        EXPECT_EQ(index.Find(&pool[i])->value, static_cast<int>(i + 1));
+    }
 }
 
 TEST(PointerIndex, ErasingFromARunMovesLaterKeysBackButNotBeforeTheirHomes) {
     KeysByHome keys;
     Index index;
+    index.Reserve(kCapacity);
     std::map<const int*, int> model;
     // Slots 10 to 14: a, b, c (home 10), d (home 11), e (home 13). Erasing a must move
     // b, c and d back one slot each, while e may move only as far as its home.
     const auto k = AddWithHomes(index, keys, model, {10, 10, 10, 11, 13, 20});
     std::vector<const int*> gone;
     for (const int* erased : {k[0], k[2], k[1], k[4], k[3], k[5]}) {
-        index.Erase(erased);
+        Erase(index, erased);
         model.erase(erased);
         gone.push_back(erased);
         SCOPED_TRACE(gone.size());
@@ -111,6 +147,7 @@ TEST(PointerIndex, ErasingFromARunMovesLaterKeysBackButNotBeforeTheirHomes) {
 TEST(PointerIndex, RunsWrapFromTheLastSlotToTheFirst) {
     KeysByHome keys;
     Index index;
+    index.Reserve(kCapacity);
     std::map<const int*, int> model;
     // Slots 62 to 4 across the end: a (home 62), b (63), c (0), d and e (62), f (2),
     // g (4). Erasing a leaves b and c at their homes, on both sides of the end, and brings
@@ -118,7 +155,7 @@ TEST(PointerIndex, RunsWrapFromTheLastSlotToTheFirst) {
     const auto k = AddWithHomes(index, keys, model, {62, 63, 0, 62, 62, 2, 4});
     std::vector<const int*> gone;
     for (const int* erased : {k[0], k[3], k[1], k[5], k[2], k[4], k[6]}) {
-        index.Erase(erased);
+        Erase(index, erased);
         model.erase(erased);
         gone.push_back(erased);
         SCOPED_TRACE(gone.size());
@@ -139,18 +176,19 @@ TEST(PointerIndex, RandomChurnAroundTheWrapKeepsEveryKeyReachable) {
     for (int round = 0; round < 200; ++round) {
         SCOPED_TRACE(round);
         Index index;
+        index.Reserve(kCapacity);
         std::map<const int*, int> model;
         std::vector<const int*> order = candidates;
         std::shuffle(order.begin(), order.end(), random);
         for (const int* key : order) {
             const int value = static_cast<int>(model.size()) + 100;
-            index.FindOrAdd(key) = value;
+            FindOrAdd(index, key) = value;
             model[key] = value;
         }
         std::shuffle(order.begin(), order.end(), random);
         std::vector<const int*> gone;
         for (std::size_t i = 0; i < order.size(); ++i) {
-            index.Erase(order[i]);
+            Erase(index, order[i]);
             model.erase(order[i]);
             gone.push_back(order[i]);
             ExpectHolds(index, model, gone);
@@ -161,7 +199,7 @@ TEST(PointerIndex, RandomChurnAroundTheWrapKeepsEveryKeyReachable) {
             if (i % 5 == 4) {
                 const int* back = gone[gone.size() / 2];
                 gone.erase(gone.begin() + static_cast<std::ptrdiff_t>(gone.size() / 2));
-                index.FindOrAdd(back) = -1;
+                FindOrAdd(index, back) = -1;
                 model[back] = -1;
                 order.push_back(back);
                 ExpectHolds(index, model, gone);

@@ -347,3 +347,54 @@ TEST(SelectionManagerScale, DescentThroughAMillionDeepChainDoesNotRecurse) {
         nodes[i]->m_children.clear();
     }
 }
+
+// Categories on both sides of 2^16 and up to the bound, holders selected once and some
+// selected again after their flag was cleared by hand, all removed in a shuffled order:
+// every removal takes the holder out of exactly its own category and once out of the
+// overall list.
+TEST(SelectionManager, WideCategoriesAndReselectionsLeaveExactlyTheirOwnPlaces) {
+    const int kTypes[] = {
+        0, 11, (1 << 16) - 1, 1 << 16, (1 << 16) + 5, SelectionManager::kMaxCategories - 1};
+    std::vector<std::unique_ptr<FakeHolder>> holders;
+    for (int i = 0; i < 600; ++i) {
+        holders.push_back(std::make_unique<FakeHolder>(kTypes[i % 6]));
+    }
+    SelectionManager manager;
+    std::vector<std::size_t> expected(6, 0);
+    for (std::size_t i = 0; i < holders.size(); ++i) {
+        manager.AddSelectedItem(holders[i].get(), false);
+        ++expected[i % 6];
+        if (i % 7 == 0) { // selected again: it stands twice in both lists
+            holders[i]->SetSelected(false);
+            manager.AddSelectedItem(holders[i].get(), false);
+            ++expected[i % 6];
+        }
+    }
+    std::vector<std::size_t> order(holders.size());
+    std::iota(order.begin(), order.end(), 0);
+    std::shuffle(order.begin(), order.end(), std::mt19937(7));
+    std::size_t all = Walk(manager.GetAllSelectedItems()).size();
+    for (std::size_t i : order) {
+        FakeHolder& h = *holders[i];
+        const std::size_t times = i % 7 == 0 ? 2 : 1;
+        manager.RemoveSelectedItem(&h, false);
+        expected[i % 6] -= times;
+        all -= 1; // the category wholly, the overall list once
+        ASSERT_FALSE(h.IsSelected());
+        const auto inCategory = Walk(manager.GetSelectedItems(kTypes[i % 6]));
+        ASSERT_EQ(inCategory.size(), expected[i % 6]) << "holder " << i;
+        EXPECT_EQ(std::count(inCategory.begin(), inCategory.end(), &h), 0);
+        ASSERT_EQ(Walk(manager.GetAllSelectedItems()).size(), all) << "holder " << i;
+    }
+    // What remains overall is the second place of each holder selected twice, in order.
+    std::vector<VnI::IPropertyHolder*> twice;
+    for (std::size_t i = 0; i < holders.size(); i += 7) {
+        twice.push_back(holders[i].get());
+    }
+    EXPECT_EQ(Walk(manager.GetAllSelectedItems()), twice);
+    for (VnI::IPropertyHolder* h : twice) {
+        manager.RemoveSelectedItem(h, false); // not in its category any more: only a note
+    }
+    manager.RemoveAll();
+    EXPECT_TRUE(Walk(manager.GetAllSelectedItems()).empty());
+}

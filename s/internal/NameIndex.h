@@ -14,6 +14,7 @@
 #include <cstring>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace Vn::Eng::detail {
@@ -51,6 +52,12 @@ public:
         m_texts.emplace_back(text);
         Place(text, position);
         return position;
+    }
+
+    void Swap(NameIndex& other) noexcept {
+        m_slots.swap(other.m_slots);
+        std::swap(m_mask, other.m_mask);
+        m_texts.swap(other.m_texts);
     }
 
     void Clear() {

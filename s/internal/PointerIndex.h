@@ -2,119 +2,177 @@
 //
 // The managers' indexes map an item's address to where it stands in their lists. At a
 // million items a node-based map costs a bucket, a node and whatever the node points to
-// on every removal; here one probe finds the value in the table itself. Linear probing
+// on every removal; here one probe finds the slot in the table itself. Linear probing
 // with backward-shift deletion keeps the table free of tombstones however many items
 // come and go.
+//
+// The slot type decides what a slot holds. A manager's slot need not hold the key: the
+// list node a slot points to already holds the item's address, so the slot keeps a
+// short tag of the key's hash beside the node, and the node is read only when the tag
+// matches. Slots are plain values (the table moves them bit for bit); a slot must have
+// these members:
+//
+//   bool Empty() const;                              // a value-initialised slot is empty
+//   const Key* KeyOf() const;                        // for a slot that is not empty
+//   bool Holds(const Key* key, std::uint64_t hash) const;
+//
+// The table is kept between 3/8 and 3/4 full (from its first key until it is cleared;
+// removals never shrink it, so that a removal never allocates), which bounds its bytes
+// per key by 8/3 of a slot's size.
 //
 //===------------------------------------------------------------------------------===//
 #pragma once
 
+#include <bit>
 #include <cstddef>
 #include <cstdint>
-#include <utility>
+#include <type_traits>
 #include <vector>
 
 namespace Vn::Eng::detail {
 
-template <class Key, class Value> class PointerIndex {
+/// A slot holding the key itself beside a value.
+template <class Key, class Value> struct KeyedSlot {
+    const Key* key = nullptr;
+    Value value{};
+
+    bool Empty() const { return key == nullptr; }
+    const Key* KeyOf() const { return key; }
+    bool Holds(const Key* k, std::uint64_t) const { return key == k; }
+};
+
+template <class Key, class Slot> class PointerIndex {
 public:
-    /// The value stored for key, or null.
-    Value* Find(const Key* key) {
+    /// The 64-bit mix of key's address: its bits 20 and up choose the home slot, its top
+    /// bits are free for a slot's tag.
+    static std::uint64_t Hash(const Key* key) {
+        // Addresses are aligned and allocated in runs: a multiplicative mix spreads them.
+        const auto bits = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(key));
+        return bits * 0x9E3779B97F4A7C15ull;
+    }
+
+    /// The slot holding key, or null.
+    Slot* Find(const Key* key) {
         if (m_size == 0) {
             return nullptr;
         }
-        for (std::size_t i = Home(key);; i = (i + 1) & Mask()) {
+        const std::uint64_t hash = Hash(key);
+        for (std::size_t i = HomeOf(hash);; i = (i + 1) & Mask()) {
             Slot& slot = m_slots[i];
-            if (slot.key == key) {
-                return &slot.value;
-            }
-            if (slot.key == nullptr) {
+            if (slot.Empty()) {
                 return nullptr;
             }
-        }
-    }
-
-    /// The value stored for key, default-constructed when key was absent.
-    Value& FindOrAdd(const Key* key) {
-        if ((m_size + 1) * 2 > m_slots.size()) {
-            Rehash(m_slots.empty() ? 64 : m_slots.size() * 2);
-        }
-        std::size_t i = Home(key);
-        for (; m_slots[i].key != nullptr; i = (i + 1) & Mask()) {
-            if (m_slots[i].key == key) {
-                return m_slots[i].value;
+            if (slot.Holds(key, hash)) {
+                return &slot;
             }
         }
-        m_slots[i].key = key;
-        m_slots[i].value = Value();
-        ++m_size;
-        return m_slots[i].value;
     }
 
-    /// Removes key (which must be present), shifting later members of its probe run back
-    /// so that no search ever needs a tombstone.
-    void Erase(const Key* key) {
-        std::size_t hole = Home(key);
-        while (m_slots[hole].key != key) {
-            hole = (hole + 1) & Mask();
+    /// An empty slot for key, which must be absent; the caller fills it for key before
+    /// the next call. Only growing the table can fail, and then nothing has changed.
+    Slot& Add(const Key* key) {
+        if ((m_size + 1) * 4 > m_slots.size() * 3) {
+            Rehash(m_slots.empty() ? 2 : m_slots.size() * 2);
         }
-        for (std::size_t next = (hole + 1) & Mask(); m_slots[next].key != nullptr;
+        std::size_t i = HomeOf(Hash(key));
+        while (!m_slots[i].Empty()) {
+            i = (i + 1) & Mask();
+        }
+        ++m_size;
+        return m_slots[i];
+    }
+
+    /// Empties slot (one of this table's), shifting later members of its probe run back
+    /// so that no search ever needs a tombstone.
+    void Erase(Slot* slot) {
+        auto hole = static_cast<std::size_t>(slot - m_slots.data());
+        for (std::size_t next = (hole + 1) & Mask(); !m_slots[next].Empty();
              next = (next + 1) & Mask()) {
-            const std::size_t home = Home(m_slots[next].key);
+            const std::size_t home = HomeOf(Hash(m_slots[next].KeyOf()));
             // Move `next` into the hole unless its home lies cyclically in (hole, next].
             const bool stays =
                 hole <= next ? (hole < home && home <= next) : (hole < home || home <= next);
             if (!stays) {
-                m_slots[hole] = std::move(m_slots[next]);
+                m_slots[hole] = m_slots[next];
                 hole = next;
             }
         }
-        m_slots[hole].key = nullptr;
-        m_slots[hole].value = Value();
+        m_slots[hole] = Slot();
         --m_size;
     }
 
     void Clear() {
-        m_slots.clear();
+        std::vector<Slot>().swap(m_slots);
         m_size = 0;
     }
 
-    /// The number of slots: 0 before the first key, then 64, doubling whenever a key
-    /// would make the table more than half full.
+    /// Makes room for at least capacity slots (rounded up to a power of two) now.
+    void Reserve(std::size_t capacity) {
+        std::size_t wanted = 2;
+        while (wanted < capacity) {
+            wanted *= 2;
+        }
+        if (wanted > m_slots.size()) {
+            Rehash(wanted);
+        }
+    }
+
+    template <class F> void ForEach(F&& f) {
+        for (Slot& slot : m_slots) {
+            if (!slot.Empty()) {
+                f(slot);
+            }
+        }
+    }
+
+    std::size_t Size() const { return m_size; }
+    /// The number of slots: 0 before the first key, then 2, doubling whenever a key
+    /// would make the table more than 3/4 full.
     std::size_t Capacity() const { return m_slots.size(); }
+    std::size_t Bytes() const { return m_slots.size() * sizeof(Slot); }
     /// The slot where probing for key begins in a table of capacity slots (a power of
     /// two), so that tests can choose keys that collide.
     static std::size_t HomeIn(const Key* key, std::size_t capacity) {
-        // Addresses are aligned and allocated in runs: a multiplicative mix spreads them.
-        const auto bits = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(key));
-        return static_cast<std::size_t>((bits * 0x9E3779B97F4A7C15ull) >> 20) & (capacity - 1);
+        return static_cast<std::size_t>(Hash(key) >> 20) & (capacity - 1);
     }
 
 private:
-    struct Slot {
-        const Key* key = nullptr;
-        Value value{};
-    };
-
     std::size_t Mask() const { return m_slots.size() - 1; }
-    std::size_t Home(const Key* key) const { return HomeIn(key, m_slots.size()); }
+    std::size_t HomeOf(std::uint64_t hash) const {
+        return static_cast<std::size_t>(hash >> 20) & Mask();
+    }
 
     void Rehash(std::size_t capacity) {
         std::vector<Slot> old(capacity);
         old.swap(m_slots);
         for (Slot& slot : old) {
-            if (slot.key != nullptr) {
-                std::size_t i = Home(slot.key);
-                while (m_slots[i].key != nullptr) {
+            if (!slot.Empty()) {
+                std::size_t i = HomeOf(Hash(slot.KeyOf()));
+                while (!m_slots[i].Empty()) {
                     i = (i + 1) & Mask();
                 }
-                m_slots[i] = std::move(slot);
+                m_slots[i] = slot;
             }
         }
     }
 
-    std::vector<Slot> m_slots; // a power of two long, at most half full
+    std::vector<Slot> m_slots; // a power of two long, at most 3/4 full
     std::size_t m_size = 0;
+};
+
+/// The bits of a std::list iterator, so that a slot can pack one with a tag: iterators
+/// of the standard libraries this builds with are one node pointer, aligned to at least
+/// eight bytes, and valid user-space addresses use the low 48 bits.
+template <class Iterator> struct IteratorBits {
+    static_assert(sizeof(Iterator) == sizeof(std::uint64_t), "a list iterator is one pointer");
+    static constexpr std::uint64_t kAddress = (std::uint64_t{1} << 48) - 8;
+
+    static_assert(std::is_trivially_copyable_v<Iterator>);
+
+    static std::uint64_t Of(Iterator it) { return std::bit_cast<std::uint64_t>(it); }
+    /// True when it can be packed: its bits outside kAddress are zero.
+    static bool Packs(Iterator it) { return (Of(it) & ~kAddress) == 0; }
+    static Iterator From(std::uint64_t bits) { return std::bit_cast<Iterator>(bits & kAddress); }
 };
 
 } // namespace Vn::Eng::detail

@@ -338,3 +338,111 @@ TEST(AllocationFailure, HighlightingLeavesListIndexAndFlagsAsTheyWere) {
     }
     EXPECT_TRUE(StateOf(manager, all).list.empty());
 }
+
+// Appending a list either takes every new name, in order, or none: a name whose creation
+// fails is never skipped while the names after it go in one place too early.
+TEST(AllocationFailure, AppendListTakesEveryNameOrNone) {
+    for (int before : {0, 3, 16}) {
+        SCOPED_TRACE(before);
+        Vn::Eng::PropertyNameList list;
+        Vn::Eng::PropertyNameList other;
+        for (int i = 0; i < before; ++i) {
+            list.AddName(LongName(i), VnI::INT_TYPE, i % 2 == 0);
+        }
+        // Two names the list has already, then twenty new ones (the vector and the index
+        // both grow on the way).
+        for (int i = before - 2; i < before + 20; ++i) {
+            if (i >= 0) {
+                other.AddName(LongName(i), VnI::STRING_TYPE, i % 3 != 0);
+            }
+        }
+        const NameListState was = StateOf(list);
+        NameListState whole = was;
+        for (int i = before; i < before + 20; ++i) {
+            whole.names.push_back(std::string(LongName(i).view()));
+        }
+        const auto* otherNames =
+            static_cast<VnI::IPropertyNameList*>(other.GetInterface(VnI::IID_IPropertyNameList));
+        // A failure the append does not need (the values iterator of a name that has no
+        // values) may let it finish; any other leaves the list untouched.
+        Vn::Eng::PropertyNameList fresh;
+        for (int i = 0; i < before; ++i) {
+            fresh.AddName(LongName(i), VnI::INT_TYPE, i % 2 == 0);
+        }
+        const long allocations =
+            FailEachAllocationInTurn([&] { list.AppendList(otherNames); },
+                                     [&](long k) {
+                                         SCOPED_TRACE(k);
+                                         const NameListState now = StateOf(list);
+                                         EXPECT_TRUE(now == was || now == whole)
+                                             << "part of the list was appended";
+                                         if (now == whole) {
+                                             list.ClearList();
+                                             list.AppendList(static_cast<VnI::IPropertyNameList*>(
+                                                 fresh.GetInterface(VnI::IID_IPropertyNameList)));
+                                             ASSERT_EQ(StateOf(list), was);
+                                         } else {
+                                             EXPECT_EQ(list.Contains(LongName(before)), -1);
+                                         }
+                                     });
+        EXPECT_GE(allocations, 20);
+        ASSERT_EQ(list.GetNumNames(), before + 20);
+        for (int i = 0; i < before + 20; ++i) {
+            ASSERT_EQ(list.Contains(LongName(i)), i);
+            EXPECT_EQ(list.GetPropertyName(i)->GetName(), LongName(i));
+            // Names already present keep their own type; the appended ones bring theirs.
+            EXPECT_EQ(list.GetPropertyName(i)->GetType(),
+                      i < before ? VnI::INT_TYPE : VnI::STRING_TYPE);
+        }
+    }
+}
+
+// ---- palettes ------------------------------------------------------------------------
+
+// Growing a palette by reading past its end, or by setting a colour past it, either
+// grows it wholly or leaves it as it was: never part way, never with a null colour.
+TEST(AllocationFailure, PaletteGrowthIsAllOrNothing) {
+    using Vn::Eng::ColorManager;
+    const auto snapshot = [] {
+        std::vector<const VnI::IColorProperty*> colours;
+        for (const auto& c : ColorManager::m_imp->m_ioBankColors) {
+            colours.push_back(c.Get());
+        }
+        return colours;
+    };
+    ASSERT_GT(ColorManager::GetNumDefaultIOBankColors(), 0) << "no colour scheme was read";
+    const int start = static_cast<int>(ColorManager::m_imp->m_ioBankColors.size());
+
+    auto was = snapshot();
+    ColorManager::Color got;
+    long allocations =
+        FailEachAllocationInTurn([&] { got = ColorManager::GetIOBankColor(start + 5, false); },
+                                 [&](long k) {
+                                     SCOPED_TRACE(k);
+                                     EXPECT_EQ(snapshot(), was);
+                                 });
+    EXPECT_GE(allocations, 6);
+    ASSERT_TRUE(got);
+    ASSERT_EQ(ColorManager::m_imp->m_ioBankColors.size(), static_cast<std::size_t>(start) + 6);
+    for (const auto& c : ColorManager::m_imp->m_ioBankColors) {
+        EXPECT_TRUE(c);
+    }
+
+    was = snapshot();
+    const auto red = RefCountPtr<VnI::IColorProperty>::Adopt(
+        Vn::Eng::PropertyFactory::CreateColorProperty(static_cast<char>(200), 0, 0, true));
+    bool set = false;
+    const auto at = static_cast<unsigned int>(start + 9);
+    allocations = FailEachAllocationInTurn([&] { set = ColorManager::SetIOBankColor(at, red); },
+                                           [&](long k) {
+                                               SCOPED_TRACE(k);
+                                               EXPECT_EQ(snapshot(), was);
+                                           });
+    EXPECT_GE(allocations, 4);
+    EXPECT_TRUE(set);
+    ASSERT_EQ(ColorManager::m_imp->m_ioBankColors.size(), static_cast<std::size_t>(at) + 1);
+    for (const auto& c : ColorManager::m_imp->m_ioBankColors) {
+        EXPECT_TRUE(c);
+    }
+    EXPECT_EQ(ColorManager::GetIOBankColor(static_cast<int>(at), false)->GetRed(), 200);
+}

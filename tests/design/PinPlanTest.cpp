@@ -22,15 +22,32 @@ using VnTool::Design;
 using VnTool::PcfFile;
 using VnTool::PinProblem;
 
+// The tiles of a whole width x height grid: IO tiles on the edges, logic inside, the
+// corners empty, as the reader wants a device's grid.
+std::string WholeGrid(int width, int height) {
+    std::string text;
+    for (int y = 0; y < height; ++y) {
+        for (int x = 0; x < width; ++x) {
+            const bool edgeX = x == 0 || x == width - 1;
+            const bool edgeY = y == 0 || y == height - 1;
+            if (edgeX && edgeY) {
+                continue;
+            }
+            text += std::string(edgeX || edgeY ? ".io_tile " : ".logic_tile ") + std::to_string(x) +
+                    " " + std::to_string(y) + "\n";
+        }
+    }
+    return text;
+}
+
 // A 6 x 6 device: pins 1-3 on the top edge (bank 0), 4-6 right (1), 7-8 bottom (2),
 // 9-10 left (3); pins 8 and 10 drive global buffers.
-const char kDevice[] = ".device t 6 6 0\n"
-                       ".pins p\n"
-                       "1 1 5 0\n2 2 5 0\n3 3 5 0\n4 5 2 0\n5 5 3 0\n6 5 3 1\n"
-                       "7 2 0 0\n8 3 0 1\n9 0 2 0\n10 0 3 1\n"
-                       ".gbufpin\n3 0 1 0\n0 3 1 1\n"
-                       ".io_tile 1 5\n.io_tile 2 5\n.io_tile 3 5\n.io_tile 5 2\n.io_tile 5 3\n"
-                       ".io_tile 2 0\n.io_tile 3 0\n.io_tile 0 2\n.io_tile 0 3\n";
+const std::string kDevice = ".device t 6 6 0\n"
+                            ".pins p\n"
+                            "1 1 5 0\n2 2 5 0\n3 3 5 0\n4 5 2 0\n5 5 3 0\n6 5 3 1\n"
+                            "7 2 0 0\n8 3 0 1\n9 0 2 0\n10 0 3 1\n"
+                            ".gbufpin\n3 0 1 0\n0 3 1 1\n" +
+                            WholeGrid(6, 6);
 
 ChipDb Device() {
     ChipDb db;
@@ -137,7 +154,8 @@ TEST(PinChecks, AClockOffTheGlobalBufferPinsIsAWarningNamingThem) {
 TEST(PinChecks, PinsAreCountedAsPeopleCountThem) {
     ChipDb db;
     std::istringstream in(".device t 4 4 0\n.pins p\nB1 0 1 0\nA10 0 2 0\nA2 0 1 1\n10 0 2 1\n"
-                          "9 3 1 0\nA02 3 1 1\n.io_tile 0 1\n.io_tile 0 2\n.io_tile 3 1\n");
+                          "9 3 1 0\nA02 3 1 1\n" +
+                          WholeGrid(4, 4));
     std::string error;
     ASSERT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
     std::vector<std::string> names;

@@ -224,6 +224,29 @@ TEST_F(KeyFile, SurvivesBinaryContent) {
     EXPECT_EQ(capture.Errors().size(), 1u);
 }
 
+TEST_F(KeyFile, RefusesAFileLargerThanTheCapBeforeReadingIt) {
+    // A list of a few hundred megabytes once took six times its size in memory; past the
+    // cap nothing of it is read. A file of exactly the cap is still taken whole.
+    const std::string key = "K = 7\n";
+    std::string atCap = "#";
+    atCap.resize(PM_DEVKEY::kMaxFileBytes - key.size() - 1, 'x');
+    atCap += '\n' + key;
+    ASSERT_EQ(atCap.size(), PM_DEVKEY::kMaxFileBytes);
+    {
+        VnTest::MessageCapture capture;
+        Reader r(Write(atCap));
+        ASSERT_EQ(r.keys.get_validity(), 1);
+        EXPECT_EQ(r.At("K", 0, 0), 7);
+        EXPECT_TRUE(capture.Errors().empty());
+    }
+    VnTest::MessageCapture capture;
+    Reader r(Write("#" + atCap));
+    EXPECT_EQ(r.keys.get_validity(), 0);
+    EXPECT_EQ(r.At("K", 0, 0), 0);
+    ASSERT_EQ(capture.Errors().size(), 1u);
+    EXPECT_NE(capture.Errors()[0].find("cannot be read"), std::string::npos) << capture.Errors()[0];
+}
+
 // ---- finding the file ------------------------------------------------------------------
 
 TEST(KeyFileLookup, AbsentFileIsSilentUnlessRequired) {

@@ -248,7 +248,7 @@ struct PM_DEVKEY::Keys {
     void Read(const std::filesystem::path& file, bool report) {
         Port::InputFile input;
         std::string why;
-        if (!input.Open(file.string(), why)) {
+        if (!input.Open(file.string(), why, kMaxFileBytes)) {
             if (report) {
                 Port_MsgManData::createObject(kDomain, kUnit, __LINE__, kRevision)
                     .issueError("Key file %s cannot be read: %s\n", path.c_str(), why.c_str());

@@ -28,6 +28,9 @@
 //   range.
 // - A file with any other line, a value that breaks these rules or a key defined twice is
 //   rejected whole: it reads as invalid and one message names the file and the line.
+// - A file larger than kMaxFileBytes (16 MiB) is not read: a colour scheme is a few
+//   kilobytes, and every integer read costs several times its text, so the cap is what
+//   keeps a stray file from taking the editor's memory.
 //
 // Reading: entries are the runs between entry separators, fields the runs between field
 // separators inside an entry, both numbered from 0. A field whose run holds another
@@ -64,6 +67,9 @@ public:
     /// `report`: whether a rejected or unreadable file is reported.
     static constexpr unsigned char kRejectionIsSilent = 0;
     static constexpr unsigned char kRejectionIsReported = 1;
+
+    /// The largest key file read; a larger one reads as invalid, with a message.
+    static constexpr unsigned long kMaxFileBytes = 16ul << 20;
 
     /// Reads the key file now; the object keeps its keys, not the file.
     /// \param part      names the part the keys are for; may be null. Key files of this
