@@ -190,6 +190,13 @@ TEST_F(EditorApi, AnswersOnlyLoopbackHostsWithItsOwnPort) {
     }
 }
 
+TEST_F(EditorApi, ASecondServerCannotShareTheBoundPort) {
+    VnTool::EditorServer second(*m_editor);
+    std::string error;
+    EXPECT_FALSE(second.Bind(m_server->Port(), error));
+    EXPECT_NE(error.find("cannot listen"), std::string::npos) << error;
+}
+
 TEST_F(EditorApi, RefusesBadRequestsAndChangesNothing) {
     std::string before = Snapshot();
     PostRaw("/api/assign", std::string(VnTool::kMaxRequestBody + 1, ' '), 413);

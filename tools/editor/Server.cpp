@@ -6,6 +6,7 @@
 #include "Port/SafeFile.h"
 
 #include <httplib.h>
+#include <sys/socket.h>
 
 #include <atomic>
 #include <chrono>
@@ -115,6 +116,13 @@ struct EditorServer::Imp {
 EditorServer::EditorServer(Editor& editor) : m_imp(std::make_unique<Imp>(editor)) {
     httplib::Server& server = m_imp->server;
     server.set_payload_max_length(kMaxRequestBody);
+    // The library's default shares the port (SO_REUSEPORT): a second server, or another
+    // program of the same user, could then take half of the page's requests. Reusing an
+    // address in TIME_WAIT is all a restart needs.
+    server.set_socket_options([](int sock) {
+        int yes = 1;
+        setsockopt(sock, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof(yes));
+    });
     server.set_pre_routing_handler(
         [this](const httplib::Request& request, httplib::Response& response) {
             response.set_header("Cache-Control", "no-store");
