@@ -20,6 +20,9 @@ namespace {
 
 const char kLoopback[] = "127.0.0.1";
 
+// Connections served at once; more wait for a free worker.
+constexpr std::size_t kWorkers = 64;
+
 // The page is small; anything bigger in its folder is not ours to serve.
 constexpr std::uint64_t kMaxPageFile = std::uint64_t{4} << 20;
 
@@ -68,6 +71,7 @@ struct EditorServer::Imp {
     std::atomic<bool> stopped{false};
     std::atomic<int> phase{0}; // 0 before Run, 1 in Run, 2 after
     int port = 0;
+    int socket = -1; // the listening socket, once bound
 
     // A loopback name or address with our port; nothing else may name us.
     bool HostAllowed(const httplib::Request& request) const {
@@ -116,12 +120,17 @@ struct EditorServer::Imp {
 EditorServer::EditorServer(Editor& editor) : m_imp(std::make_unique<Imp>(editor)) {
     httplib::Server& server = m_imp->server;
     server.set_payload_max_length(kMaxRequestBody);
+    // A worker stays with a kept-alive connection until it idles out; with the library's
+    // few default workers, a few open tabs or scripts would starve the rest. Workers only
+    // wait for the editor's lock, so many are cheap.
+    server.new_task_queue = [] { return new httplib::ThreadPool(kWorkers); };
     // The library's default shares the port (SO_REUSEPORT): a second server, or another
     // program of the same user, could then take half of the page's requests. Reusing an
     // address in TIME_WAIT is all a restart needs.
-    server.set_socket_options([](int sock) {
+    server.set_socket_options([this](int sock) {
         int yes = 1;
         setsockopt(sock, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof(yes));
+        m_imp->socket = sock;
     });
     server.set_pre_routing_handler(
         [this](const httplib::Request& request, httplib::Response& response) {
@@ -208,6 +217,12 @@ bool EditorServer::Bind(int port, std::string& error) {
         return false;
     }
     m_imp->port = m_port;
+    // The library listens with a backlog of 5: fifty clients connecting at once would
+    // overflow it and some would see their connection reset. Listening again only
+    // deepens the queue.
+    if (m_imp->socket >= 0) {
+        ::listen(m_imp->socket, SOMAXCONN);
+    }
     return true;
 }
 
