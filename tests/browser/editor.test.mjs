@@ -44,6 +44,7 @@ const synth = spawnSync('yosys', ['-q', '-p', `synth_ice40 -top top -json ${netl
 if (synth.status !== 0) fail(`yosys failed: ${synth.stderr}`);
 writeFileSync(pcf, '# board pins\n');
 
+const spawned = Date.now();
 const server = spawn(venlomer, ['edit', '--design', netlist, '--pcf', pcf, '--device', '8k'],
   { stdio: ['ignore', 'pipe', 'inherit'] });
 const url = await new Promise((resolve, reject) => {
@@ -56,6 +57,7 @@ const url = await new Promise((resolve, reject) => {
   server.on('exit', (code) => reject(new Error(`venlomer edit exited with ${code}: ${out}`)));
   setTimeout(() => reject(new Error(`no URL within 60 s: ${out}`)), 60000);
 });
+const listening = Date.now() - spawned;
 
 let status = 0;
 let browser = null;
@@ -72,8 +74,11 @@ try {
   const page = await browser.newPage();
   const errors = [];
   page.on('pageerror', (error) => errors.push(error.message));
+  const opening = Date.now();
   await page.goto(url);
   await page.waitForSelector('body[data-ready="true"]', { timeout: 30000 });
+  // Information only; timing is scripts/bench-editor's job.
+  console.log(`# listening ${listening} ms after start; page ready ${Date.now() - opening} ms after opening it`);
   check(await page.locator('#floorplan rect').count() === 1152, 'the 8k floorplan shows 1152 tiles');
   check(await page.locator('#floorplan circle.pin').count() === 206, 'and 206 pins of ct256');
 
