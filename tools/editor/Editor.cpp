@@ -159,32 +159,27 @@ struct Editor::State {
     // The design > bus > bit tree; a one-bit port sits directly under the design.
     void BuildDesignTree() {
         auto root = Vn::Eng::TreeGroupNode::CreateInstance(Text(design.top.c_str()), nullptr);
+        // The design's children in netlist order: a one-bit port, or a bus's group with
+        // its bits in their netlist order.
         std::vector<Ptr<VnI::ITreeNode>> children;
-        std::map<std::string, Ptr<VnI::ITreeNode>> buses;
+        std::map<std::string, std::pair<Ptr<VnI::ITreeNode>, std::vector<PortHolder*>>> buses;
         for (const DesignPort& port : design.ports) {
             PortHolder* holder = portByName.at(port.name);
             if (port.bit < 0 && port.width == 1) {
                 children.push_back(Vn::Eng::TreeNode::CreateInstance(holder, root));
                 continue;
             }
-            auto& bus = buses[port.bus];
-            if (!bus) {
-                bus = Vn::Eng::TreeGroupNode::CreateInstance(Text(port.bus.c_str()), root);
-                children.push_back(bus);
+            auto& [node, bits] = buses[port.bus];
+            if (!node) {
+                node = Vn::Eng::TreeGroupNode::CreateInstance(Text(port.bus.c_str()), root);
+                children.push_back(node);
             }
-            // Bits are added in reverse below, so they are gathered first.
-            (void)bus;
+            bits.push_back(holder);
         }
         // AddChild puts a child in front of its siblings: add last to first.
-        std::map<std::string, std::vector<PortHolder*>> bits;
-        for (const DesignPort& port : design.ports) {
-            if (!(port.bit < 0 && port.width == 1)) {
-                bits[port.bus].push_back(portByName.at(port.name));
-            }
-        }
-        for (auto& [bus, holders] : bits) {
-            auto node = buses[bus];
-            for (auto it = holders.rbegin(); it != holders.rend(); ++it) {
+        for (auto& [name, bus] : buses) {
+            auto& [node, bits] = bus;
+            for (auto it = bits.rbegin(); it != bits.rend(); ++it) {
                 node->AddChild(Vn::Eng::TreeNode::CreateInstance(*it, node));
             }
         }
