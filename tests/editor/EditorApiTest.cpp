@@ -352,6 +352,24 @@ TEST_F(EditorApi, SelectionFollowsClicksShiftClicksAndBankNodes) {
     EXPECT_EQ(byName["Pin"], "1");
     EXPECT_EQ(byName["Bank"], 2); // pin 1 lies on the bottom edge
 
+    // Every node of the trees can be selected by the id the tree gives it.
+    json tree = Get("/api/tree");
+    std::vector<const json*> work{&tree["roots"][0], &tree["roots"][1]};
+    int ids = 0;
+    while (!work.empty()) {
+        const json* node = work.back();
+        work.pop_back();
+        if (node->contains("id")) {
+            json selectedNow = Post("/api/select", {{"id", (*node)["id"]}})["selected"];
+            EXPECT_EQ(selectedNow, json({(*node)["id"]}));
+            ++ids;
+        }
+        for (const json& child : (*node)["children"]) {
+            work.push_back(&child);
+        }
+    }
+    EXPECT_GT(ids, static_cast<int>(device["tiles"].size()));
+
     state = Post("/api/select", {{"id", "pin:1"}});
     EXPECT_EQ(state["selected"], json({"pin:1"}));
     EXPECT_EQ(Get("/api/properties")["kind"], "pin");

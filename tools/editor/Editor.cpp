@@ -229,6 +229,15 @@ struct Editor::State {
             bool whole = ec == std::errc() && end == number.data() + number.size();
             return whole && bank >= 0 && bank < kBankCount ? device->Bank(bank) : nullptr;
         }
+        if (id.rfind("tile:", 0) == 0) {
+            // A tree click away; a linear look among a thousand tiles costs nothing.
+            for (DeviceHolder* tile : device->Tiles()) {
+                if (tile->GetName().str() == id.substr(5)) {
+                    return tile;
+                }
+            }
+            return nullptr;
+        }
         if (id == "device") {
             return device->Device();
         }
