@@ -25,6 +25,7 @@ const Command& ProjectFilesCommand();
 const Command& PinsCheckCommand();
 const Command& PinsAssignCommand();
 const Command& PinsShowCommand();
+const Command& EditCommand();
 
 /// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
 int UsageError(const std::string& command, const std::string& why);

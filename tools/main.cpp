@@ -28,6 +28,7 @@ const std::vector<const Command*>& AllCommands() {
         &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),     &VnTool::NgcStubCommand(),
         &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(),  &VnTool::ProjectFilesCommand(),
         &VnTool::PinsCheckCommand(), &VnTool::PinsAssignCommand(), &VnTool::PinsShowCommand(),
+        &VnTool::EditCommand(),
     };
     return commands;
 }

@@ -1,0 +1,190 @@
+// The editor page: draws what the server answers and sends what the user does.
+import { get, post } from './api.js';
+import { Floorplan } from './floorplan.js';
+import { Tree } from './tree.js';
+
+const FLAGS = ['exact', 'ignore-case', 'substring', 'regexp', 'less', 'greater', 'within-5-percent'];
+const $ = (id) => document.getElementById(id);
+
+let state = null;
+let device = null;
+let floorplan = null;
+let tree = null;
+
+function show(error) {
+  const box = $('message');
+  box.textContent = error.message || String(error);
+  box.hidden = false;
+  clearTimeout(show.timer);
+  show.timer = setTimeout(() => { box.hidden = true; }, 5000);
+}
+
+async function act(promise) {
+  try {
+    render(await promise);
+  } catch (error) {
+    show(error);
+  }
+}
+
+function element(tag, props = {}, ...children) {
+  const node = document.createElement(tag);
+  Object.assign(node, props);
+  for (const child of children) node.append(child);
+  return node;
+}
+
+function render(next) {
+  state = next;
+  const matched = new Set(state.matches);
+  const selected = new Set(state.selected);
+  const problemPorts = new Set(state.problemPorts);
+  $('files').textContent = `${state.files.pcf} · ${state.files.design} · ${device.name} ${device.package}`;
+  const saved = $('saved');
+  saved.dataset.saved = String(state.saved);
+  saved.textContent = state.saved ? 'saved' : 'unsaved';
+  $('undo').disabled = !state.canUndo;
+  $('redo').disabled = !state.canRedo;
+  $('found').textContent = state.matches.length ? `${state.matches.length} found` : '';
+
+  floorplan.update(state);
+  tree.update(selected, matched);
+
+  const list = $('ports');
+  list.replaceChildren();
+  for (const port of state.ports) {
+    const item = element('li', { draggable: true, title: `${port.direction}${port.clock ? ', clock' : ''}` },
+      element('span', { className: 'name', textContent: port.name }),
+      element('span', { className: 'pin', textContent: port.pin || '—' }));
+    item.dataset.id = port.id;
+    item.classList.toggle('sel', selected.has(port.id));
+    item.classList.toggle('hl', matched.has(port.id));
+    item.classList.toggle('problem', problemPorts.has(port.name));
+    item.addEventListener('click', (event) => select(port.id, event.shiftKey, false));
+    item.addEventListener('dragstart', (event) => {
+      event.dataTransfer.setData('text/plain', port.name);
+      event.dataTransfer.effectAllowed = 'link';
+    });
+    list.append(item);
+  }
+
+  const problems = $('problems');
+  problems.replaceChildren();
+  for (const problem of state.problems) {
+    problems.append(element('li', { className: problem.severity, textContent: problem.message }));
+  }
+  $('problemCount').textContent = state.problems.length ? `(${state.problems.length})` : '';
+  loadProperties();
+}
+
+async function loadProperties() {
+  const panel = $('properties-panel');
+  let answer;
+  try {
+    answer = await get('/api/properties');
+  } catch (error) {
+    show(error);
+    return;
+  }
+  panel.replaceChildren();
+  if (!answer.id) {
+    panel.textContent = 'Nothing selected.';
+    return;
+  }
+  const table = element('table');
+  for (const property of answer.properties) {
+    table.append(element('tr', {}, element('td', { textContent: property.name }),
+      element('td', { textContent: String(property.value) })));
+  }
+  panel.append(element('div', { className: 'what', textContent: answer.id }), table);
+  if (answer.kind === 'port') {
+    const port = answer.id.slice('port:'.length);
+    const current = state.ports.find((p) => p.name === port);
+    const choose = element('select', { id: 'pinChoice' });
+    choose.append(element('option', { value: '', textContent: '(no pin)' }));
+    for (const pin of device.pins) {
+      const taken = state.assignments[pin.name];
+      choose.append(element('option', {
+        value: pin.name,
+        textContent: `${pin.name} (bank ${pin.bank})${taken && taken !== port ? ' – ' + taken : ''}`,
+      }));
+    }
+    choose.value = current ? current.pin : '';
+    choose.addEventListener('change', () => {
+      if (choose.value) {
+        act(post('/api/assign', { port, pin: choose.value }));
+      } else {
+        act(post('/api/unassign', { port }));
+      }
+    });
+    panel.append(element('label', {}, 'Pin ', choose));
+  }
+}
+
+function select(id, shift, descend) {
+  act(post('/api/select', { id, mode: shift ? 'toggle' : 'replace', descend }));
+}
+
+function search(event) {
+  event?.preventDefault();
+  const flags = FLAGS.filter((flag) => $(`flag-${flag}`).checked);
+  act(post('/api/search', { property: $('property').value, value: $('value').value, flags }));
+}
+
+function clearAll() {
+  $('value').value = '';
+  act(post('/api/search', { clear: true }).then(() => post('/api/select', { clear: true })));
+}
+
+function undo(redo) {
+  if (!state) return;
+  act(post(redo ? '/api/redo' : '/api/undo', { step: state.revision }));
+}
+
+function save() {
+  act(post('/api/save'));
+}
+
+function keys(event) {
+  const typing = ['INPUT', 'SELECT', 'TEXTAREA'].includes(document.activeElement?.tagName);
+  const ctrl = event.ctrlKey || event.metaKey;
+  if (event.key === '/' && !typing) {
+    event.preventDefault();
+    $('value').focus();
+  } else if (event.key === 'Escape') {
+    document.activeElement?.blur();
+    clearAll();
+  } else if (ctrl && event.key.toLowerCase() === 'z') {
+    event.preventDefault();
+    undo(event.shiftKey);
+  } else if (ctrl && event.key.toLowerCase() === 's') {
+    event.preventDefault();
+    save();
+  }
+}
+
+async function start() {
+  for (const flag of FLAGS) {
+    const box = element('input', { type: 'checkbox', id: `flag-${flag}`, checked: flag === 'exact' });
+    $('flags').append(element('label', {}, box, ` ${flag}`));
+  }
+  [device, state] = await Promise.all([get('/api/device'), get('/api/state')]);
+  document.documentElement.style.setProperty('--sel', device.selectedPath[1] || '#4477aa');
+  floorplan = new Floorplan($('floorplan'), $('tip'), device, {
+    select,
+    assign: (port, pin) => act(post('/api/assign', { port, pin })),
+  });
+  floorplan.legend($('legend'));
+  tree = new Tree($('tree'), await get('/api/tree'), select);
+  $('search').addEventListener('submit', search);
+  $('clear').addEventListener('click', clearAll);
+  $('undo').addEventListener('click', () => undo(false));
+  $('redo').addEventListener('click', () => undo(true));
+  $('auto').addEventListener('click', () => act(post('/api/auto')));
+  $('save').addEventListener('click', save);
+  document.addEventListener('keydown', keys);
+  render(state);
+  document.body.dataset.ready = 'true';
+}
+
+start().catch(show);

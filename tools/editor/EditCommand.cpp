@@ -1,0 +1,185 @@
+//===-- tools/editor/EditCommand.cpp - venlomer edit: the editor in a browser -----===//
+//
+// Options, the recovery file's offer, signals and the autosave: everything around the
+// engine and the server that a command needs and a test does not.
+//
+//===------------------------------------------------------------------------------===//
+#include "Commands.h"
+#include "Editor.h"
+#include "Server.h"
+
+#include "DeviceOptions.h"
+
+#include <condition_variable>
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <mutex>
+#include <pthread.h>
+#include <thread>
+
+namespace VnTool {
+
+namespace {
+
+const char kCommand[] = "edit";
+
+// How often unsaved work goes to the recovery file.
+constexpr auto kRecoveryInterval = std::chrono::seconds(2);
+
+int Run(const ParsedArgs& args) {
+    EditorFiles files;
+    files.design = args.Value("--design");
+    files.pcf = args.Value("--pcf");
+    if (files.design.empty() || files.pcf.empty()) {
+        return UsageError(kCommand, "--design and --pcf are required");
+    }
+    std::string error;
+    DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
+    switch (ResolveDevice(request, files.device, error)) {
+    case DeviceResolution::Ok:
+        break;
+    case DeviceResolution::BadUsage:
+        return UsageError(kCommand, error);
+    case DeviceResolution::Missing:
+        return Refused(kCommand, error);
+    }
+    if (files.device.chipDb == "-") {
+        return UsageError(kCommand, "the editor reads its chip database from a file, not "
+                                    "standard input");
+    }
+    int port = 0;
+    if (args.Has("--port")) {
+        std::string text = args.Value("--port");
+        char* end = nullptr;
+        long value = std::strtol(text.c_str(), &end, 10);
+        if (text.empty() || *end != '\0' || value < 0 || value > 65535) {
+            return UsageError(kCommand, "--port wants 0..65535, got \"" + text + "\"");
+        }
+        port = static_cast<int>(value);
+    }
+    if (args.Has("--recover") && args.Has("--discard-recovery")) {
+        return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
+    }
+
+    std::string page = FindDataFile("editor/index.html");
+    if (page.empty()) {
+        return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
+                                 "VENLOMER_DATA_PATH to the folder that holds it");
+    }
+    if (!files.device.note.empty()) {
+        std::printf("Note: %s\n", files.device.note.c_str());
+    }
+    Editor editor;
+    if (!editor.Open(files, error)) {
+        return Refused(kCommand, error);
+    }
+    if (editor.HasRecovery()) {
+        if (args.Has("--recover")) {
+            if (!editor.LoadRecovery(error)) {
+                return Refused(kCommand, error);
+            }
+            std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
+                        editor.RecoveryPath().c_str(), files.pcf.c_str());
+        } else if (args.Has("--discard-recovery")) {
+            std::error_code ec;
+            std::filesystem::remove(editor.RecoveryPath(), ec);
+            std::printf("Dropped the unsaved changes of an earlier session (%s)\n",
+                        editor.RecoveryPath().c_str());
+        } else {
+            // Starting over it would overwrite that work with this session's.
+            return Refused(kCommand, editor.RecoveryPath() +
+                                         " holds unsaved changes of an earlier session: start "
+                                         "with --recover to load them, or --discard-recovery "
+                                         "to drop them");
+        }
+    } else if (args.Has("--recover")) {
+        std::printf("No unsaved changes to recover (%s does not exist)\n",
+                    editor.RecoveryPath().c_str());
+    }
+
+    EditorServer server(editor);
+    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
+        !server.Bind(port, error)) {
+        return Refused(kCommand, error);
+    }
+
+    // Signals are taken by one thread with sigwait, so no handler runs inside the server
+    // or the library; every thread started below inherits the mask.
+    sigset_t stopSignals;
+    sigemptyset(&stopSignals);
+    sigaddset(&stopSignals, SIGINT);
+    sigaddset(&stopSignals, SIGTERM);
+    pthread_sigmask(SIG_BLOCK, &stopSignals, nullptr);
+
+    std::mutex lock;
+    std::condition_variable wake;
+    bool stopping = false;
+    std::thread serving([&] { server.Run(); });
+    std::thread autosave([&] {
+        std::unique_lock<std::mutex> hold(lock);
+        while (!wake.wait_for(hold, kRecoveryInterval, [&] { return stopping; })) {
+            std::string why;
+            if (!editor.WriteRecovery(why)) {
+                std::fprintf(stderr, "venlomer edit: the recovery file was not written: %s\n",
+                             why.c_str());
+            }
+        }
+    });
+    std::printf("Editing %s with %s on %s\nOpen %s in a browser; Ctrl-C stops.\n",
+                files.pcf.c_str(), files.design.c_str(), files.device.chipDb.c_str(),
+                server.Url().c_str());
+    std::fflush(stdout);
+
+    int signal = 0;
+    sigwait(&stopSignals, &signal);
+    server.Stop();
+    serving.join();
+    {
+        std::lock_guard<std::mutex> hold(lock);
+        stopping = true;
+    }
+    wake.notify_all();
+    autosave.join();
+    if (!editor.WriteRecovery(error)) {
+        return Refused(kCommand, "the unsaved changes were not kept: " + error);
+    }
+    if (editor.Unsaved()) {
+        std::printf("Stopped; unsaved changes kept in %s (start with --recover to load them)\n",
+                    editor.RecoveryPath().c_str());
+    } else {
+        std::printf("Stopped; nothing unsaved\n");
+    }
+    return kExitOk;
+}
+
+} // namespace
+
+const Command& EditCommand() {
+    static const Command command{
+        {kCommand,
+         "",
+         "plan pins in a browser: a local editor served on 127.0.0.1",
+         {
+             {"--design", "FILE", "yosys JSON netlist of the design (required)"},
+             {"--pcf", "FILE", "constraint file to edit; created by the first Save (required)"},
+             {"--chipdb", "FILE", "chip database (default: chipdb-8k.txt of fpga-icestorm-chipdb)"},
+             {"--device", "NAME", "chipdb-NAME.txt of the chip-database folder"},
+             {"--package", "NAME", "package whose pins to plan (default: the device's usual)"},
+             {"--port", "N", "port to listen on (default: 0, a free port)"},
+             {"--recover", "", "load the unsaved changes an earlier session left"},
+             {"--discard-recovery", "", "drop the unsaved changes an earlier session left"},
+         },
+         0,
+         0,
+         "The server listens on 127.0.0.1 only and prints the address to open. Unsaved\n"
+         "changes go to FILE.recovery beside the constraint file every few seconds and on\n"
+         "stop (Ctrl-C or SIGTERM); a later start refuses to run over them until told\n"
+         "--recover or --discard-recovery.\n"
+         "Example: venlomer edit --design top.json --pcf top.pcf --device 8k\n"},
+        Run};
+    return command;
+}
+
+} // namespace VnTool

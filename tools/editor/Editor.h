@@ -1,0 +1,102 @@
+//===-- tools/editor/Editor.h - the pin-planning editor's engine ------------------===//
+//
+// \file
+// One object holds everything a browser session edits: the design's ports as holders,
+// the constraint file, the device, the selection and the highlight, and the undo
+// history. The HTTP server hands it every API request as (method, path, body) and sends
+// back what it answers; nothing else touches the library, and Handle() takes the one
+// lock, because the library's colour manager changes state on look-up and the managers
+// keep plain pointers.
+//
+// The JSON API (every body is a JSON object; errors are {"error": "why"} with a 4xx):
+//
+//   GET  /api/state       revision, saved, canUndo, canRedo, files (names only), ports
+//                         [{id,name,bus,bit,direction,clock,pin,bank}], assignments
+//                         {pin: port}, problems [{severity,port,pin,message}], problem
+//                         pins and ports, selected ids, highlighted pins {pin: colour},
+//                         matched ids of the last search.
+//   GET  /api/device      the device once: name, package, width, height, tiles
+//                         [{name,x,y,type,site,color}], pins [{id,name,bank,x,y,block,
+//                         gbuf,color}], bank colours, selected-path colours.
+//   GET  /api/tree        {roots: [node]}, node = {label, id (absent for groups),
+//                         children}; the device's and the design's trees as the library's
+//                         tree models give them.
+//   POST /api/search      {property, value, flags: ["exact", "ignore-case", "substring",
+//                         "regexp", "less", "greater", "within-5-percent", "any"]}: the
+//                         pins and ports whose property matches; matched pins become the
+//                         highlight. {clear: true} drops the search. Answers the state.
+//   POST /api/select      {id, mode: "replace" | "toggle" | "add", descend}: a click,
+//                         a shift-click, a tree node with the holders below it;
+//                         {clear: true} empties the selection. Answers the state.
+//   GET  /api/properties  the properties of the holder selected last: {id, kind,
+//                         properties: [{name, type, value}]}; {id: null} when none.
+//   POST /api/assign      {port, pin}: puts the port on the pin.
+//   POST /api/unassign    {port}: takes the port off its pin.
+//   POST /api/auto        {}: gives every port without a pin a free one.
+//   POST /api/undo        {step}: step is the revision the page shows; a stale one is
+//   POST /api/redo        refused (409), so two tabs cannot undo each other's work.
+//   POST /api/save        {}: writes the constraint file through the safe writer.
+//
+// Changes answer the state; an assignment that would add an error of the checks is
+// refused (409, the messages) and changes nothing, as `pins assign` refuses it. Unknown
+// ports, pins and ids are 404, malformed requests 400.
+//
+//===------------------------------------------------------------------------------===//
+#pragma once
+
+#include "ChipDb.h"
+#include "DeviceOptions.h"
+#include "Pcf.h"
+#include "PinPlan.h"
+#include "YosysPorts.h"
+
+#include <memory>
+#include <mutex>
+#include <string>
+
+namespace VnTool {
+
+struct EditorFiles {
+    std::string design;  ///< yosys JSON netlist
+    std::string pcf;     ///< constraint file; created by the first save when missing
+    DeviceSource device; ///< chip database and package
+};
+
+struct EditorReply {
+    int status = 200;
+    std::string body; ///< JSON
+};
+
+class Editor {
+public:
+    Editor();
+    ~Editor();
+    Editor(const Editor&) = delete;
+    Editor& operator=(const Editor&) = delete;
+
+    /// Reads the three files. False with a one-line reason naming file and line.
+    bool Open(const EditorFiles& files, std::string& error);
+
+    /// Where unsaved work goes: beside the constraint file.
+    std::string RecoveryPath() const;
+    /// Whether a recovery file from an earlier session exists.
+    bool HasRecovery() const;
+    /// Takes the recovery file's constraints as unsaved work. False with a reason when it
+    /// cannot be read or parsed; nothing changes then.
+    bool LoadRecovery(std::string& error);
+    /// Writes the recovery file when there is unsaved work it does not hold yet. False
+    /// with a reason when the write failed.
+    bool WriteRecovery(std::string& error);
+    /// Whether there is work the constraint file does not hold.
+    bool Unsaved() const;
+
+    /// Serves one API request under the lock.
+    EditorReply Handle(const std::string& method, const std::string& path, const std::string& body);
+
+private:
+    struct State;
+    std::unique_ptr<State> m_state;
+    mutable std::mutex m_lock;
+};
+
+} // namespace VnTool
