@@ -76,7 +76,8 @@ struct EditorServer::Imp {
     // A loopback name or address with our port; nothing else may name us.
     bool HostAllowed(const httplib::Request& request) const {
         std::string host = request.get_header_value("Host");
-        std::string suffix = ":" + std::to_string(port);
+        std::string suffix = std::to_string(port);
+        suffix.insert(suffix.begin(), ':');
         for (const char* name : {"127.0.0.1", "localhost"}) {
             if (host == name + suffix) {
                 return true;
@@ -90,7 +91,8 @@ struct EditorServer::Imp {
             return true; // not a browser's cross-origin request
         }
         std::string origin = request.get_header_value("Origin");
-        std::string suffix = ":" + std::to_string(port);
+        std::string suffix = std::to_string(port);
+        suffix.insert(suffix.begin(), ':');
         return origin == "http://127.0.0.1" + suffix || origin == "http://localhost" + suffix;
     }
 
@@ -194,7 +196,8 @@ bool EditorServer::Load(const std::string& folder, std::string& error) {
             error = failure;
             return false;
         }
-        std::string url = "/" + fs::relative(it->path(), folder, ec).generic_string();
+        std::string url = fs::relative(it->path(), folder, ec).generic_string();
+        url.insert(url.begin(), '/');
         m_imp->files[url] = {mime, bytes.str()};
     }
     if (m_imp->files.count("/index.html") == 0) {
