@@ -161,8 +161,8 @@ const Target kTargets[] = {
      "1500 ns on the reference machine"},
     {Kind::Reference, "ports of a 100 MB yosys netlist: time", "design/ports_100mb",
      "design/read_bytes_100mb", 0, "vs reading its bytes"},
-    {Kind::Reference, "  (peak memory of that read)", "design/ports_100mb_peak",
-     "design/read_bytes_100mb_peak", 0, "vs reading its bytes"},
+    {Kind::Goal, "  its peak memory growth (streamed)", "design/ports_100mb_peak", nullptr,
+     64.0 * 1024 * 1024, "<= 64 MiB for a 100 MB file"},
 };
 
 struct Row {
