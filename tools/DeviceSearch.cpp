@@ -1,6 +1,8 @@
 //===-- tools/DeviceSearch.cpp - search, select and print a device model's holders ===//
 #include "DeviceSearch.h"
 
+#include "CompareFlags.h"
+
 #include "Commands.h"
 
 #include "VnI/IDeviceResource.h"
@@ -21,23 +23,6 @@ namespace {
 
 template <class T> using Ptr = CommonI::RefCountPtr<T>;
 
-struct FlagName {
-    const char* name;
-    int bit;
-};
-
-// The compare flags by the names the user types.
-const FlagName kFlagNames[] = {
-    {"exact", VnI::MATCH_EXACT},
-    {"ignore-case", VnI::MATCH_IGNORE_CASE},
-    {"substring", VnI::MATCH_SUBSTRING},
-    {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
-    {"less", VnI::MATCH_LESS},
-    {"greater", VnI::MATCH_GREATER},
-    {"any", VnI::MATCH_ANY},
-    {"regexp", VnI::MATCH_REGEXP},
-};
-
 bool ParseFlags(const std::string& list, int& flags, std::string& error) {
     flags = 0;
     std::size_t start = 0;
@@ -47,19 +32,12 @@ bool ParseFlags(const std::string& list, int& flags, std::string& error) {
             end = list.size();
         }
         std::string word = list.substr(start, end - start);
-        bool known = false;
-        for (const auto& flag : kFlagNames) {
-            if (word == flag.name) {
-                flags |= flag.bit;
-                known = true;
-            }
-        }
-        if (!known) {
-            error = "unknown compare flag \"" + word +
-                    "\"; use exact, ignore-case, substring, within-5-percent, less, greater, "
-                    "any, regexp";
+        const std::optional<int> bit = CompareFlagNamed(word);
+        if (!bit) {
+            error = "unknown compare flag \"" + word + "\"; use " + CompareFlagWords();
             return false;
         }
+        flags |= *bit;
         start = end + 1;
     }
     return true;
@@ -111,13 +89,7 @@ int ParseSearchArgs(const std::string& command, const ParsedArgs& args, SearchRe
 }
 
 std::string FlagsText(int flags) {
-    std::string text;
-    for (const auto& flag : kFlagNames) {
-        if ((flags & flag.bit) != 0) {
-            text += (text.empty() ? "" : ",") + std::string(flag.name);
-        }
-    }
-    return text.empty() ? "exact" : text;
+    return CompareFlagsText(flags);
 }
 
 std::string ValueText(const Ptr<VnI::IProperty>& property) {

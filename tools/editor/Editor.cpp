@@ -1,6 +1,7 @@
 //===-- tools/editor/Editor.cpp - the pin-planning editor's engine ----------------===//
 #include "Editor.h"
 
+#include "CompareFlags.h"
 #include "DeviceModel.h"
 #include "PortHolders.h"
 
@@ -23,6 +24,7 @@
 #include <filesystem>
 #include <list>
 #include <map>
+#include <optional>
 #include <set>
 #include <unordered_map>
 #include <vector>
@@ -37,22 +39,6 @@ template <class T> using Ptr = CommonI::RefCountPtr<T>;
 
 // How many steps undo keeps; a plan is a few hundred assignments at most.
 constexpr std::size_t kUndoDepth = 1000;
-
-struct FlagName {
-    const char* name;
-    int bit;
-};
-
-const FlagName kFlagNames[] = {
-    {"exact", VnI::MATCH_EXACT},
-    {"ignore-case", VnI::MATCH_IGNORE_CASE},
-    {"substring", VnI::MATCH_SUBSTRING},
-    {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
-    {"less", VnI::MATCH_LESS},
-    {"greater", VnI::MATCH_GREATER},
-    {"any", VnI::MATCH_ANY},
-    {"regexp", VnI::MATCH_REGEXP},
-};
 
 // A refusal: the request changes nothing and the page shows `what`.
 struct Refusal {
@@ -569,16 +555,12 @@ struct Editor::State {
                 throw Refusal{400, "\"flags\" is a list of compare flag names"};
             }
             for (const json& flag : *it) {
-                bool known = false;
-                for (const FlagName& name : kFlagNames) {
-                    if (flag.is_string() && flag.get<std::string>() == name.name) {
-                        flags |= name.bit;
-                        known = true;
-                    }
-                }
-                if (!known) {
+                const std::optional<int> bit =
+                    flag.is_string() ? CompareFlagNamed(flag.get<std::string>()) : std::nullopt;
+                if (!bit) {
                     throw Refusal{400, "unknown compare flag " + flag.dump()};
                 }
+                flags |= *bit;
             }
         }
         std::vector<VnI::IPropertyHolder*> found;
