@@ -6,7 +6,9 @@
 // test instead of hanging it.
 //
 //===------------------------------------------------------------------------------===//
+#include "ProcessHelpers.h"
 #include <expat.h>
+
 #include <gtest/gtest.h>
 
 #include <fcntl.h>
@@ -32,35 +34,11 @@
 namespace {
 
 namespace fs = std::filesystem;
-
-std::string Slurp(const fs::path& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream text;
-    text << in.rdbuf();
-    return text.str();
-}
-
-void Put(const fs::path& path, const std::string& text) {
-    std::ofstream(path, std::ios::binary) << text;
-}
-
-std::string Quote(const std::string& arg) {
-    std::string quoted = "'";
-    for (char c : arg) {
-        quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
-    }
-    return quoted + "'";
-}
-
-bool Contains(const std::string& text, const std::string& part) {
-    return text.find(part) != std::string::npos;
-}
-
-struct Result {
-    int status = -1; // 124 when the time limit ended the run
-    std::string out;
-    std::string err;
-};
+using VnTest::Contains;
+using VnTest::Quote;
+using VnTest::Result;
+using VnTest::Slurp;
+using VnTest::WriteBytes;
 
 // A whole SVG document: the tool's pictures end with the closing tag and a newline.
 bool WholeSvg(const std::string& text) {
@@ -113,7 +91,7 @@ protected:
 // ---- writing ---------------------------------------------------------------------------
 
 TEST_F(FileSafety, APlantedLinkInTheOutputFolderNeverRedirectsTheWrite) {
-    Put(m_dir / "victim.txt", "the planter's target");
+    WriteBytes(m_dir / "victim.txt", "the planter's target");
     fs::create_directory(m_dir / "shared");
     fs::create_symlink(m_dir / "victim.txt", m_dir / "shared" / "out.svg.part");
     Result result = Draw((m_dir / "shared" / "out.svg").string());
@@ -188,7 +166,7 @@ TEST_F(FileSafety, AFifoOutputIsWrittenInPlace) {
 }
 
 TEST_F(FileSafety, AReplacedFileKeepsItsModeAndALinkToItStaysALink) {
-    Put(m_dir / "plan.svg", "old");
+    WriteBytes(m_dir / "plan.svg", "old");
     ASSERT_EQ(::chmod((m_dir / "plan.svg").c_str(), 0600), 0);
     fs::create_symlink("plan.svg", m_dir / "link.svg");
     Result result = Draw("link.svg");
@@ -211,7 +189,7 @@ TEST_F(FileSafety, TheLongestLegalNameIsAcceptedAndLeftoversOfGoneRunsAreCleaned
     }();
     char leftover[64];
     std::snprintf(leftover, sizeof leftover, ".venlomer-%08x-0badf00d.tmp", unsigned(gone));
-    Put(m_dir / leftover, "<?xml half a pic");
+    WriteBytes(m_dir / leftover, "<?xml half a pic");
     struct timeval times[2];
     ::gettimeofday(&times[0], nullptr);
     times[0].tv_sec -= 600;
@@ -293,7 +271,7 @@ TEST_F(FileSafety, AKilledRunLeavesTheOldFileOrTheNewOneWhole) {
     int sawOld = 0;
     int sawNew = 0;
     for (int attempt = 0; attempt < kAttempts; ++attempt) {
-        Put(m_dir / "plan.svg", old);
+        WriteBytes(m_dir / "plan.svg", old);
         const pid_t child = ::fork();
         ASSERT_GE(child, 0);
         if (child == 0) {
@@ -316,7 +294,7 @@ TEST_F(FileSafety, AKilledRunLeavesTheOldFileOrTheNewOneWhole) {
     // ones land after the rename unless the machine is busy, which the run below shows.
     EXPECT_GT(sawOld, 0);
     if (sawNew == 0) {
-        Put(m_dir / "plan.svg", old);
+        WriteBytes(m_dir / "plan.svg", old);
         ASSERT_EQ(std::system(Command(args, "").c_str()), 0) << Slurp(m_dir / "stderr");
         EXPECT_EQ(Slurp(m_dir / "plan.svg"), fresh);
     }
@@ -378,7 +356,7 @@ TEST_F(FileSafety, NamesThatAreNotUtf8GiveAPictureXmlReadersAccept) {
     text.replace(text.find(".device demo"), 12, ".device d\xe9mo\x01");
     const std::size_t pins = text.find('\n', text.find(".pins")) + 1;
     text.replace(pins, text.find(' ', pins) - pins, "P\xfc\xff\xc0");
-    Put(m_chipDb, text);
+    WriteBytes(m_chipDb, text);
     Result result = Draw("names.svg", "Name=P");
     ASSERT_EQ(result.status, 0) << result.err;
     const std::string svg = Slurp(m_dir / "names.svg");
@@ -387,14 +365,14 @@ TEST_F(FileSafety, NamesThatAreNotUtf8GiveAPictureXmlReadersAccept) {
 }
 
 TEST_F(FileSafety, ControlBytesFromFilesReachTheTerminalEscaped) {
-    Put(m_dir / "evil.txt", ".device x 4 4 0\n.io_tilx\x1b[2J\x07 0 1\n");
+    WriteBytes(m_dir / "evil.txt", ".device x 4 4 0\n.io_tilx\x1b[2J\x07 0 1\n");
     Result result = Run({"floorplan", "--chipdb", "evil.txt"});
     EXPECT_EQ(result.status, 1);
     EXPECT_TRUE(Contains(result.err, ".io_tilx\\x1b[2J\\x07")) << result.err;
     EXPECT_FALSE(Contains(result.err, "\x1b")) << result.err;
 
     // The library's own messages pass the same way.
-    Put(m_dir / "evil.prj", "project \"\x1b]0;owned\x07\n");
+    WriteBytes(m_dir / "evil.prj", "project \"\x1b]0;owned\x07\n");
     Result project = Run({"project-files", "--project", "evil.prj"});
     EXPECT_EQ(project.status, 1);
     EXPECT_TRUE(Contains(project.err, "[library error]")) << project.err;
@@ -420,7 +398,7 @@ TEST_F(FileSafety, AColourSchemeWithCrOnlyLineEndsReadsAsWritten) {
     for (char& c : scheme) {
         c = c == '\n' ? '\r' : c;
     }
-    Put(m_dir / "rareroded.acd", scheme);
+    WriteBytes(m_dir / "rareroded.acd", scheme);
     int raw = std::system(
         ("export VENLOMER_DATA_PATH=" + Quote(m_dir.string()) + "; " + Command({"colors"}, ""))
             .c_str());
@@ -442,7 +420,7 @@ TEST_F(FileSafety, ATruncatedChipDatabaseIsRefusedWithItsLine) {
         while (cut >= bulk && whole[cut - 1] == '\n') {
             --cut; // a cut at a line end after the tiles leaves a whole device
         }
-        Put(m_dir / "cut.txt", whole.substr(0, cut));
+        WriteBytes(m_dir / "cut.txt", whole.substr(0, cut));
         Result result = Run({"floorplan", "--chipdb", "cut.txt", "--svg", "cut.svg"});
         EXPECT_EQ(result.status, 1) << "cut at " << cut;
         EXPECT_TRUE(Contains(result.err, "venlomer floorplan: cut.txt:")) << result.err;

@@ -6,6 +6,8 @@
 // port at the IO block the chip database gives its pin, icepack making a bitstream.
 //
 //===------------------------------------------------------------------------------===//
+#include "ProcessHelpers.h"
+
 #include <gtest/gtest.h>
 
 #include <sys/wait.h>
@@ -25,35 +27,11 @@
 namespace {
 
 namespace fs = std::filesystem;
-
-struct Result {
-    int status = -1;
-    std::string out;
-    std::string err;
-};
-
-std::string Slurp(const fs::path& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream text;
-    text << in.rdbuf();
-    return text.str();
-}
-
-void Spill(const fs::path& path, const std::string& text) {
-    std::ofstream(path, std::ios::binary) << text;
-}
-
-std::string Quote(const std::string& arg) {
-    std::string quoted = "'";
-    for (char c : arg) {
-        quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
-    }
-    return quoted + "'";
-}
-
-bool Contains(const std::string& text, const std::string& part) {
-    return text.find(part) != std::string::npos;
-}
+using VnTest::Contains;
+using VnTest::Quote;
+using VnTest::Result;
+using VnTest::Slurp;
+using VnTest::WriteBytes;
 
 int Lines(const std::string& text) {
     int lines = 0;
@@ -204,7 +182,7 @@ TEST_F(PinsProcess, AssignCreatesTheFileThenChecksCleanAndKeepsWhatItDoesNotOwn)
     EXPECT_EQ(Lines(text), 10) << text;
 
     // The user's lines survive a reassignment; only the moved port's line changes.
-    Spill(pcf, "# board rev B\nset_frequency clk 12\n" + text);
+    WriteBytes(pcf, "# board rev B\nset_frequency clk 12\n" + text);
     Result moved = Pins("assign", pcf.string(), {"rst=2"});
     ASSERT_EQ(moved.status, 0) << moved.err;
     std::string after = Slurp(pcf);
@@ -274,13 +252,13 @@ TEST_F(PinsProcess, RefusedAssignmentsAndBadInputLeaveEveryFileUntouched) {
     ExpectUntouched(m_json, design, "netlist given as --pcf");
 
     // Bad inputs: one line naming the file and line, nothing written.
-    Spill(m_dir / "broken.json", "{\"modules\": {\n\"top\": {\"ports\":\n{,}}}}\n");
-    Spill(m_dir / "notyosys.json", "{\"hello\": 1}\n");
-    Spill(m_dir / "twotops.json",
-          "{\"modules\": {\"a\": {\"ports\": {}}, \"b\": {\"ports\": {}}}}\n");
-    Spill(m_dir / "syntax.pcf", "set_io clk 21\nset_io -pullup maybe rst 1\n");
-    Spill(m_dir / "unknown.pcf", "set_io clk 21\nset_io rst 999\n");
-    Spill(m_dir / "dup.pcf", "set_io clk 21\nset_io clk 21\n");
+    WriteBytes(m_dir / "broken.json", "{\"modules\": {\n\"top\": {\"ports\":\n{,}}}}\n");
+    WriteBytes(m_dir / "notyosys.json", "{\"hello\": 1}\n");
+    WriteBytes(m_dir / "twotops.json",
+               "{\"modules\": {\"a\": {\"ports\": {}}, \"b\": {\"ports\": {}}}}\n");
+    WriteBytes(m_dir / "syntax.pcf", "set_io clk 21\nset_io -pullup maybe rst 1\n");
+    WriteBytes(m_dir / "unknown.pcf", "set_io clk 21\nset_io rst 999\n");
+    WriteBytes(m_dir / "dup.pcf", "set_io clk 21\nset_io clk 21\n");
     struct Bad {
         std::string design;
         std::string pcf;
@@ -314,7 +292,7 @@ TEST_F(PinsProcess, RefusedAssignmentsAndBadInputLeaveEveryFileUntouched) {
 
 TEST_F(PinsProcess, ShowLabelsAssignedPinsAndMarksProblemsAndSearchesPorts) {
     fs::path pcf = m_dir / "top.pcf";
-    Spill(pcf, "set_io clk 21\nset_io led[0] 112\nset_io rst 1\n");
+    WriteBytes(pcf, "set_io clk 21\nset_io led[0] 112\nset_io rst 1\n");
     Result result = Pins("show", pcf.string(),
                          {"--find", "Name=led", "--flags", "substring", "--svg", "plan.svg"});
     ASSERT_EQ(result.status, 0) << result.err;
@@ -333,7 +311,7 @@ TEST_F(PinsProcess, ShowLabelsAssignedPinsAndMarksProblemsAndSearchesPorts) {
     EXPECT_EQ(assigned, 3u);
 
     // The clock moved off a global-buffer pin is a problem pin, drawn as one.
-    Spill(pcf, "set_io clk 2\nset_io led[0] 112\n");
+    WriteBytes(pcf, "set_io clk 2\nset_io led[0] 112\n");
     Result moved = Pins("show", pcf.string(), {"--svg", "plan.svg"});
     ASSERT_EQ(moved.status, 0) << moved.err;
     EXPECT_TRUE(Contains(moved.out, "Pins: 1 assigned, 1 with problems")) << moved.out;

@@ -6,7 +6,9 @@
 // database, not from the tool's reader.
 //
 //===------------------------------------------------------------------------------===//
+#include "ProcessHelpers.h"
 #include <expat.h>
+
 #include <gtest/gtest.h>
 #include <sqlite3.h>
 
@@ -25,27 +27,11 @@
 namespace {
 
 namespace fs = std::filesystem;
-
-struct Result {
-    int status = -1;
-    std::string out;
-    std::string err;
-};
-
-std::string Slurp(const fs::path& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream text;
-    text << in.rdbuf();
-    return text.str();
-}
-
-std::string Quote(const std::string& arg) {
-    std::string quoted = "'";
-    for (char c : arg) {
-        quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
-    }
-    return quoted + "'";
-}
+using VnTest::Contains;
+using VnTest::Quote;
+using VnTest::Result;
+using VnTest::Slurp;
+using VnTest::WriteBytes;
 
 int LineCount(const std::string& text) {
     int lines = 0;
@@ -197,10 +183,6 @@ Scan ScanChipDb(const std::string& path, const std::string& package) {
 std::string SystemChipDb(const char* name) {
     std::string path = std::string(VENLOMER_SYSTEM_CHIPDB_DIR) + "/" + name;
     return fs::exists(path) ? path : std::string();
-}
-
-bool Contains(const std::string& text, const std::string& part) {
-    return text.find(part) != std::string::npos;
 }
 
 // ---- the tool as a whole ---------------------------------------------------------------
