@@ -10,19 +10,17 @@
 //
 //===------------------------------------------------------------------------------===//
 #include "Harness.h"
+#include "Machine.h"
 
 #include <algorithm>
 #include <array>
 #include <cstdio>
 #include <cstring>
-#include <fstream>
 #include <functional>
 #include <limits>
 #include <map>
 #include <string>
 #include <vector>
-
-#include <unistd.h>
 
 namespace VnBench {
 
@@ -220,25 +218,6 @@ Row Measure(const Target& t, const CollectingReporter& results) {
     return row;
 }
 
-std::string ReadFirstLine(const char* path, const char* prefix) {
-    std::ifstream in(path);
-    std::string line;
-    while (std::getline(in, line)) {
-        if (line.rfind(prefix, 0) == 0) {
-            const auto colon = line.find(':');
-            return colon == std::string::npos ? line : line.substr(colon + 2);
-        }
-    }
-    return "unknown";
-}
-
-std::string Load() {
-    std::ifstream in("/proc/loadavg");
-    std::string one, five, fifteen;
-    in >> one >> five >> fifteen;
-    return one + " " + five + " " + fifteen;
-}
-
 std::string FormatRatios(const Row& row) {
     std::string text;
     for (std::size_t r = 0; r < kRuns; ++r) {
@@ -259,11 +238,9 @@ int PrintTable(const CollectingReporter& results, const std::string& loadBefore)
     for (const Target& t : kTargets) {
         rows.push_back(Measure(t, results));
     }
-    std::printf("\nCPU: %s, %ld logical CPUs\n",
-                ReadFirstLine("/proc/cpuinfo", "model name").c_str(),
-                sysconf(_SC_NPROCESSORS_ONLN));
+    std::printf("\nCPU: %s, %ld logical CPUs\n", CpuModel().c_str(), LogicalCpus());
     std::printf("load average (1, 5, 15 min): %s before, %s after\n", loadBefore.c_str(),
-                Load().c_str());
+                LoadAverage().c_str());
     std::printf("ratios of %d interleaved runs; a goal is met only when it is met in each\n",
                 kRuns);
     std::printf("\n%-46s %12s %12s  %-21s  %-36s %s\n", "measurement", "ours", "baseline",
@@ -331,7 +308,7 @@ int main(int argc, char** argv) {
     VnBench::RegisterHolderBenchmarks();
     VnBench::RegisterDesignBenchmarks();
     VnBench::CollectingReporter reporter;
-    const std::string loadBefore = VnBench::Load();
+    const std::string loadBefore = VnBench::LoadAverage();
     benchmark::RunSpecifiedBenchmarks(&reporter);
     benchmark::Shutdown();
     return VnBench::PrintTable(reporter, loadBefore);

@@ -378,6 +378,39 @@ TEST_F(EditorApi, SelectionFollowsClicksShiftClicksAndBankNodes) {
     EXPECT_TRUE(Get("/api/properties")["id"].is_null());
 }
 
+TEST_F(EditorApi, EveryAnswerLaidOverTheStateBeforeGivesTheStateAfter) {
+    // The page keeps the state it was given and lays each answer over it; an answer that
+    // left out a field its request changed would leave the page showing the old one.
+    json held = Get("/api/state");
+    auto step = [&](const std::string& path, const json& body) {
+        json answer = Post(path, body);
+        EXPECT_TRUE(answer.is_object()) << path;
+        if (answer.is_object()) {
+            held.update(answer);
+        }
+        EXPECT_EQ(held, Get("/api/state")) << path << " " << body.dump();
+        return answer;
+    };
+    json marks =
+        step("/api/search", {{"property", "Name"}, {"value", "led"}, {"flags", {"substring"}}});
+    // A search touches neither the plan nor its checks, so it does not carry them.
+    EXPECT_FALSE(marks.contains("ports"));
+    EXPECT_FALSE(marks.contains("problems"));
+    step("/api/select", {{"id", "port:led[1]"}});
+    step("/api/select", {{"id", "bank:0"}, {"descend", true}, {"mode", "add"}});
+    json plan = step("/api/assign", {{"port", "led[1]"}, {"pin", "10"}});
+    EXPECT_FALSE(plan.contains("selected"));
+    // Matches found before the assignment stay what the search found.
+    step("/api/search", {{"property", "Pin"}, {"value", "10"}});
+    step("/api/unassign", {{"port", "led[0]"}});
+    step("/api/undo", {{"step", held["revision"]}});
+    step("/api/redo", {{"step", held["revision"]}});
+    step("/api/auto", json::object());
+    step("/api/save", json::object());
+    step("/api/search", {{"clear", true}});
+    step("/api/select", {{"clear", true}});
+}
+
 TEST_F(EditorApi, AutoGivesEveryPortAPinOnce) {
     json state = Post("/api/auto", json::object());
     for (const json& port : state["ports"]) {

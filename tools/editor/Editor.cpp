@@ -240,7 +240,17 @@ struct Editor::State {
 
     // ---- answers ------------------------------------------------------------------------
 
+    // An answer carries only the parts its request can change, and the page lays it over
+    // what it holds: a search among 200 ports answers a kilobyte of marks, not the whole
+    // plan with a message for every port. GET /api/state is both parts.
     json StateJson() const {
+        json state = PlanJson();
+        state.update(MarksJson());
+        return state;
+    }
+
+    // What the edits change: the assignments, their checks, undo and save.
+    json PlanJson() const {
         json state;
         state["revision"] = revision;
         state["saved"] = !Unsaved();
@@ -259,8 +269,7 @@ struct Editor::State {
                  {"direction", PortDirectionName(port.direction)},
                  {"clock", port.clock},
                  {"pin", holder->GetPropertyByName("Pin")->GetStringProperty().str()},
-                 {"bank", holder->GetPropertyByName("Bank")->GetIntProperty()},
-                 {"selected", holder->IsSelected()}});
+                 {"bank", holder->GetPropertyByName("Bank")->GetIntProperty()}});
         }
         state["ports"] = std::move(portList);
         json assignments = json::object();
@@ -292,6 +301,14 @@ struct Editor::State {
         state["errors"] = errors;
         state["problemPins"] = problemPins;
         state["problemPorts"] = problemPorts;
+        return state;
+    }
+
+    // What a search and a click change: the selection and the highlight. The revision rides
+    // along so that the page's undo step stays the plan's.
+    json MarksJson() const {
+        json state;
+        state["revision"] = revision;
         json selected = json::array();
         for (auto it = selection().GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
             std::string id = IdOf(it->CurrentItem());
@@ -645,12 +662,12 @@ struct Editor::State {
         if (path == "/api/search") {
             want(true);
             Search(request);
-            return StateJson();
+            return MarksJson();
         }
         if (path == "/api/select") {
             want(true);
             Select(request);
-            return StateJson();
+            return MarksJson();
         }
         if (path == "/api/assign") {
             want(true);
@@ -661,7 +678,7 @@ struct Editor::State {
                 throw Refusal{404, "package " + db().package + " has no pin \"" + pin + "\""};
             }
             Edit([&](PcfFile& next) { next.Assign(port, pin); });
-            return StateJson();
+            return PlanJson();
         }
         if (path == "/api/unassign") {
             want(true);
@@ -672,7 +689,7 @@ struct Editor::State {
                     throw Refusal{409, "port \"" + port + "\" has no pin"};
                 }
             });
-            return StateJson();
+            return PlanJson();
         }
         if (path == "/api/auto") {
             want(true);
@@ -681,19 +698,19 @@ struct Editor::State {
                     throw Refusal{409, "no port without a pin got one"};
                 }
             });
-            return StateJson();
+            return PlanJson();
         }
         if (path == "/api/undo" || path == "/api/redo") {
             want(true);
             CheckStep(request);
             bool isUndo = path == "/api/undo";
             Travel(isUndo ? undo : redo, isUndo ? redo : undo, isUndo ? "undo" : "redo");
-            return StateJson();
+            return PlanJson();
         }
         if (path == "/api/save") {
             want(true);
             Save();
-            return StateJson();
+            return PlanJson();
         }
         throw Refusal{404, "no such API: " + path};
     }

@@ -10,11 +10,13 @@
 //
 // The JSON API (every body is a JSON object; errors are {"error": "why"} with a 4xx):
 //
-//   GET  /api/state       revision, saved, canUndo, canRedo, files (names only), ports
-//                         [{id,name,bus,bit,direction,clock,pin,bank}], assignments
-//                         {pin: port}, problems [{severity,port,pin,message}], problem
-//                         pins and ports, selected ids, highlighted pins {pin: colour},
-//                         matched ids of the last search.
+//   GET  /api/state       the whole state: the plan and the marks below.
+//                         The plan: revision, saved, canUndo, canRedo, files (names
+//                         only), ports [{id,name,bus,bit,direction,clock,pin,bank}],
+//                         assignments {pin: port}, problems [{severity,port,pin,message}],
+//                         errors, problemPins, problemPorts.
+//                         The marks: revision, selected ids, highlighted pins {pin:
+//                         colour}, matches (ids of the last search), matchColor.
 //   GET  /api/device      the device once: name, package, width, height, tiles
 //                         [{name,x,y,type,site,color}], pins [{id,name,bank,x,y,block,
 //                         gbuf,color}], bank colours, selected-path colours.
@@ -24,10 +26,10 @@
 //   POST /api/search      {property, value, flags: ["exact", "ignore-case", "substring",
 //                         "regexp", "less", "greater", "within-5-percent", "any"]}: the
 //                         pins and ports whose property matches; matched pins become the
-//                         highlight. {clear: true} drops the search. Answers the state.
+//                         highlight. {clear: true} drops the search. Answers the marks.
 //   POST /api/select      {id, mode: "replace" | "toggle" | "add", descend}: a click,
 //                         a shift-click, a tree node with the holders below it;
-//                         {clear: true} empties the selection. Answers the state.
+//                         {clear: true} empties the selection. Answers the marks.
 //   GET  /api/properties  the properties of the holder selected last: {id, kind,
 //                         properties: [{name, type, value}]}; {id: null} when none.
 //   POST /api/assign      {port, pin}: puts the port on the pin.
@@ -37,9 +39,10 @@
 //   POST /api/redo        refused (409), so two tabs cannot undo each other's work.
 //   POST /api/save        {}: writes the constraint file through the safe writer.
 //
-// Changes answer the state; an assignment that would add an error of the checks is
-// refused (409, the messages) and changes nothing, as `pins assign` refuses it. Unknown
-// ports, pins and ids are 404, malformed requests 400.
+// The other changes answer the plan. An answer holds every field of its part, so laying it
+// over the state held before gives the state after. An assignment that would add an error
+// of the checks is refused (409, the messages) and changes nothing, as `pins assign`
+// refuses it. Unknown ports, pins and ids are 404, malformed requests 400.
 //
 //===------------------------------------------------------------------------------===//
 #pragma once

@@ -19,7 +19,9 @@ export class Floorplan {
     this.labels = new Map();
     const width = device.width * CELL;
     const height = device.height * CELL;
-    this.view = { x: -CELL, y: -CELL, w: width + 2 * CELL, h: height + 2 * CELL };
+    // Room outside the grid for the port names, which point outward from their edge.
+    const margin = 4 * CELL;
+    this.view = { x: -margin, y: -margin, w: width + 2 * margin, h: height + 2 * margin };
     this.applyView();
     const place = (x, y) => [x * CELL, (device.height - 1 - y) * CELL];
     const tiles = svg('g', { class: 'tiles' });
@@ -36,7 +38,9 @@ export class Floorplan {
     for (const pin of device.pins) {
       const [px, py] = place(pin.x, pin.y);
       const offset = (pin.block === 0 ? -0.22 : 0.22) * CELL;
-      const horizontal = pin.bank === 0 || pin.bank === 2;
+      const edge = pin.y === device.height - 1 ? 'top' : pin.y === 0 ? 'bottom'
+        : pin.x === 0 ? 'left' : 'right';
+      const horizontal = edge === 'top' || edge === 'bottom';
       const cx = px + CELL / 2 + (horizontal ? offset : 0);
       const cy = py + CELL / 2 + (horizontal ? 0 : offset);
       const circle = svg('circle', { cx, cy, r: 3, fill: pin.color, class: 'pin' });
@@ -58,7 +62,21 @@ export class Floorplan {
       });
       pins.append(circle);
       this.pins.set(pin.name, { pin, circle });
-      const label = svg('text', { x: cx + 4, y: cy - 4, class: 'label' });
+      // Pins sit two to a tile, 8 units apart, and a name is longer than that: side by
+      // side the names of a crowded edge run into each other. Each name instead leaves
+      // its pin at a right angle to the edge, outward, so neighbours stay parallel.
+      const label = svg('text', { class: `label ${edge}`, 'dominant-baseline': 'central' });
+      if (edge === 'top' || edge === 'bottom') {
+        const ly = edge === 'top' ? py - 2 : py + CELL + 2;
+        label.setAttribute('x', cx);
+        label.setAttribute('y', ly);
+        label.setAttribute('transform', `rotate(-90 ${cx} ${ly})`);
+        label.setAttribute('text-anchor', edge === 'top' ? 'start' : 'end');
+      } else {
+        label.setAttribute('x', edge === 'left' ? px - 2 : px + CELL + 2);
+        label.setAttribute('y', cy);
+        label.setAttribute('text-anchor', edge === 'left' ? 'end' : 'start');
+      }
       labels.append(label);
       this.labels.set(pin.name, label);
     }

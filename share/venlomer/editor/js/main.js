@@ -19,9 +19,14 @@ function show(error) {
   show.timer = setTimeout(() => { box.hidden = true; }, 5000);
 }
 
+// An answer holds only the part of the state its request can change (the plan, or the
+// selection and the highlight); every field of that part is there, so laying it over
+// what the page holds gives the server's state after the change.
 async function act(promise) {
   try {
-    render(await promise);
+    // Spread after the wait: another answer may have come in meanwhile.
+    const answer = await promise;
+    render({ ...state, ...answer });
   } catch (error) {
     show(error);
   }
