@@ -263,7 +263,9 @@ bool StringProperty::Equals(const CommonI::RefCountPtr<const VnI::IProperty>& ot
         return m_value.GetIndexOfString(theirs, type) != Port::StringBase<char>::npos;
     }
     if (ignoreCase) {
-        return m_value.Compare(theirs, Port::StringBase<char>::kIgnoreCase) == 0;
+        // Folding maps each byte to one byte, so texts of different lengths never match.
+        return m_value.GetLength() == theirs.GetLength() &&
+               m_value.Compare(theirs, Port::StringBase<char>::kIgnoreCase) == 0;
     }
     // Less, greater and within 5 % have no meaning for texts.
     return false;
