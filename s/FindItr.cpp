@@ -4,11 +4,7 @@
 #include "s/FindItr.h"
 
 #include "CommonI/TRefCountHelper.h"
-#include "s/internal/Lookahead.h"
 #include "s/internal/Shapes.h"
-
-#include <array>
-#include <cstddef>
 
 namespace Vn::Eng {
 
@@ -54,82 +50,10 @@ struct Record {
         if (itr == nullptr || !m_propertyToMatch) {
             return;
         }
-        PropertyHolderList::const_iterator at;
-        if (const PropertyHolderList* list = detail::WalkedList(*itr, at)) {
-            MatchStepLookingAhead(*itr, *list, at);
-            return;
-        }
         while (!itr->IsEnd() && !Matches(itr->CurrentItem())) {
             itr->Next();
         }
     }
-
-    // The same steps over a list of holders, asking for the memory of the holders ahead
-    // in stages: a holder's record once the holder has arrived, its slot once the record
-    // has, the property once the slot has (see s/internal/Lookahead.h).
-    void MatchStepLookingAhead(VnI::IPropertyHolderItr& itr, const PropertyHolderList& list,
-                               PropertyHolderList::const_iterator ahead) {
-        constexpr std::size_t kRing = 16; // a power of two above kLead
-        constexpr std::size_t kLead = 12;
-        constexpr std::size_t kRecordAt = 9;
-        constexpr std::size_t kSlotAt = 6;
-        constexpr std::size_t kPropertyAt = 3;
-        struct Ahead {
-            VnI::IPropertyHolder* holder;
-            const PropertyHolder* own;
-        };
-        std::array<Ahead, kRing> ring{};
-        std::size_t position = 0; // of the holder itr stands on; ring[position % kRing]
-        std::size_t known = 0;    // holders from there on read into the ring
-        const std::size_t size = list.size();
-        int slot = -1; // where the first holder keeps the name; most share its list
-        bool slotKnown = false;
-        auto at = [&](std::size_t distance) -> Ahead& {
-            return ring[(position + distance) % kRing];
-        };
-        while (!itr.IsEnd()) {
-            for (; known < kLead && ahead != list.end(); ++known, ++ahead) {
-                at(known) = Ahead{*ahead, nullptr};
-                detail::Hint(*ahead);
-            }
-            if (known > kRecordAt && at(kRecordAt).holder != nullptr) {
-                Ahead& next = at(kRecordAt);
-                next.own = m_own.Of(next.holder);
-                if (next.own != nullptr) {
-                    detail::HintRecord(*next.own);
-                }
-            }
-            if (slotKnown && known > kSlotAt && at(kSlotAt).own != nullptr) {
-                detail::HintSlot(*at(kSlotAt).own, slot);
-            }
-            if (slotKnown && known > kPropertyAt && at(kPropertyAt).own != nullptr) {
-                detail::HintProperty(*at(kPropertyAt).own, slot);
-            }
-            VnI::IPropertyHolder* holder = itr.CurrentItem();
-            if (!slotKnown && holder != nullptr) {
-                VnI::IPropertyNameList* names = holder->GetPropertyNames();
-                slot = names != nullptr ? names->Contains(m_propNameToMatch) : -1;
-                slotKnown = true;
-            }
-            if (Matches(holder)) {
-                return;
-            }
-            if (list.size() != size) {
-                // The holders' own calls changed the list: the position ahead may be
-                // gone. Read on without hints.
-                itr.Next();
-                while (!itr.IsEnd() && !Matches(itr.CurrentItem())) {
-                    itr.Next();
-                }
-                return;
-            }
-            itr.Next();
-            ++position;
-            known = known > 0 ? known - 1 : 0;
-        }
-    }
-
-    detail::OwnHolders m_own;
 };
 
 } // namespace FindItrImp

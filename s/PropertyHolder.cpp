@@ -4,7 +4,6 @@
 #include "s/PropertyHolder.h"
 
 #include "s/PropertyItr.h"
-#include "s/internal/Lookahead.h"
 #include "s/internal/Shapes.h"
 #include "s/internal/TreeLinks.h"
 
@@ -38,24 +37,6 @@ struct Record {
 
 TreeNode*& detail::NodesShowing(PropertyHolder& holder) {
     return holder.m_imp->m_nodesShowing;
-}
-
-void detail::HintRecord(const PropertyHolder& holder) {
-    Hint(holder.m_imp);
-}
-
-void detail::HintSlot(const PropertyHolder& holder, int index) {
-    const auto& slots = holder.m_imp->m_properties;
-    if (index >= 0 && static_cast<std::size_t>(index) < slots.size()) {
-        Hint(&slots[static_cast<std::size_t>(index)]);
-    }
-}
-
-void detail::HintProperty(const PropertyHolder& holder, int index) {
-    const auto& slots = holder.m_imp->m_properties;
-    if (index >= 0 && static_cast<std::size_t>(index) < slots.size()) {
-        Hint(slots[static_cast<std::size_t>(index)].Get());
-    }
 }
 
 PropertyHolder::PropertyHolder() : m_imp(new PropertyHolderImp::Record()) {}

@@ -37,11 +37,6 @@ struct Record;
 namespace detail {
 // Where the nodes that show a holder are listed, so a dying holder can tell them.
 TreeNode*& NodesShowing(PropertyHolder& holder);
-// Hints for a walk over many holders (s/internal/Lookahead.h): the holder's record, the
-// slot at index, the property in that slot.
-void HintRecord(const PropertyHolder& holder);
-void HintSlot(const PropertyHolder& holder, int index);
-void HintProperty(const PropertyHolder& holder, int index);
 } // namespace detail
 
 class VENLOMER_API PropertyHolder : public VnI::IPropertyHolder {
@@ -97,9 +92,6 @@ public:
 
 private:
     friend TreeNode*& detail::NodesShowing(PropertyHolder& holder);
-    friend void detail::HintRecord(const PropertyHolder& holder);
-    friend void detail::HintSlot(const PropertyHolder& holder, int index);
-    friend void detail::HintProperty(const PropertyHolder& holder, int index);
 
     PropertyHolderImp::Record* m_imp;
 };
