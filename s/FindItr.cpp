@@ -5,6 +5,7 @@
 
 #include "CommonI/TRefCountHelper.h"
 #include "s/internal/Shapes.h"
+#include "s/internal/TextSearch.h"
 
 namespace Vn::Eng {
 
@@ -20,13 +21,15 @@ struct Record {
            const Port::StringBase<char>& name,
            const CommonI::RefCountPtr<const VnI::IProperty>& property, int flags)
         : m_flags(flags), m_propNameToMatch(name), m_propertyToMatch(property),
-          m_propHolderItr(itr), m_xIRefCount(owner) {}
+          m_propHolderItr(itr), m_xIRefCount(owner), m_textMatch(property.Get(), flags) {}
 
     int m_flags;
     Port::StringBase<char> m_propNameToMatch;
     CommonI::RefCountPtr<const VnI::IProperty> m_propertyToMatch;
     CommonI::RefCountPtr<VnI::IPropertyHolderItr> m_propHolderItr;
     CommonI::TRefCountHelper<FindItr, 0> m_xIRefCount;
+    // Holds a borrowed pointer to the property above, which outlives it.
+    detail::PreparedTextMatch m_textMatch;
 
     bool Matches(VnI::IPropertyHolder* holder) const {
         if (holder == nullptr) {
@@ -34,7 +37,13 @@ struct Record {
         }
         const CommonI::RefCountPtr<VnI::IProperty> candidate =
             holder->GetPropertyByName(m_propNameToMatch);
-        return candidate && candidate->Equals(m_propertyToMatch, m_flags);
+        if (!candidate) {
+            return false;
+        }
+        if (m_textMatch.Answers(*candidate)) {
+            return m_textMatch.Matches(*candidate);
+        }
+        return candidate->Equals(m_propertyToMatch, m_flags);
     }
 
     void Rewind() {

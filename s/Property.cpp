@@ -7,6 +7,7 @@
 #include "Port/MsgMan.h"
 #include "Port/Regexp.h"
 #include "s/PossibleEnumValuesItr.h"
+#include "s/internal/TextSearch.h"
 
 #include <climits>
 #include <cmath>
@@ -60,48 +61,77 @@ template <class T> bool NumberMatches(T mine, T theirs, int flags) {
     return mine == theirs;
 }
 
+/// The expression a search with MATCH_REGEXP runs: the pattern, between ".*" for
+/// MATCH_SUBSTRING, ignoring case for MATCH_IGNORE_CASE (ASCII letters, as everywhere
+/// else: upper-casing the pattern would turn escapes such as \d, \w and \s into their
+/// negations).
+Port_Regexp SearchExpression(const Port::StringBase<char>& pattern, int flags) {
+    const auto letterCase = (flags & VnI::MATCH_IGNORE_CASE) != 0 ? Port_Regexp::Case::Ignore
+                                                                  : Port_Regexp::Case::Match;
+    std::string body;
+    body.reserve(pattern.GetLength() + 5);
+    if ((flags & VnI::MATCH_SUBSTRING) != 0) {
+        body += ".*";
+    }
+    body += pattern.view();
+    if ((flags & VnI::MATCH_SUBSTRING) != 0) {
+        body += ".*";
+    }
+    Port_Regexp compiled(std::string_view(body), letterCase);
+    if (compiled.IsValid()) {
+        // The match is anchored at the start anyway, so a leading ^ changes no outcome;
+        // but it lets the engine test a pattern's literal prefix with one compare before
+        // running its automaton. Whether the pattern is valid is still decided without
+        // it: ^ makes some invalid patterns ("(?)?x") valid.
+        Port_Regexp anchored(std::string_view("^" + body), letterCase);
+        if (anchored.IsValid()) {
+            return anchored;
+        }
+    }
+    return compiled;
+}
+
 /// The regular-expression test: the pattern must match at the very start of the value.
 bool RegexpMatches(const Port::StringBase<char>& value, const Port::StringBase<char>& pattern,
                    int flags) {
     // A search compares a million values with one pattern: keep the last expression
     // built, so each comparison costs a text compare and one anchored match.
     const int shape = flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING);
-    const auto build = [&] {
-        // Case is ignored by the expression itself (ASCII letters, as everywhere else):
-        // upper-casing the pattern would turn escapes such as \d, \w and \s into their
-        // negations. With the expression ignoring case, upper-casing the value as well
-        // would change no outcome.
-        const auto letterCase = (shape & VnI::MATCH_IGNORE_CASE) != 0 ? Port_Regexp::Case::Ignore
-                                                                      : Port_Regexp::Case::Match;
-        std::string body;
-        body.reserve(pattern.GetLength() + 5);
-        if ((shape & VnI::MATCH_SUBSTRING) != 0) {
-            body += ".*";
-        }
-        body += pattern.view();
-        if ((shape & VnI::MATCH_SUBSTRING) != 0) {
-            body += ".*";
-        }
-        Port_Regexp compiled(std::string_view(body), letterCase);
-        if (compiled.IsValid()) {
-            // The match is anchored at the start anyway, so a leading ^ changes no
-            // outcome; but it lets the engine test a pattern's literal prefix with one
-            // compare before running its automaton, which rejects most values of a
-            // search at a fraction of the cost. Whether the pattern is valid is still
-            // decided without it: ^ makes some invalid patterns ("(?)?x") valid.
-            Port_Regexp anchored(std::string_view("^" + body), letterCase);
-            if (anchored.IsValid()) {
-                return anchored;
-            }
-        }
-        return compiled;
-    };
-    // The value matches when a match of the expression starts at its first byte.
+    const auto build = [&] { return SearchExpression(pattern, shape); };
     if (Port::LastBuilt<Port_Regexp>::Gone()) {
         return build().MatchesAtStart(value.view());
     }
     thread_local Port::LastBuilt<Port_Regexp> last;
     return last.Get(pattern.view(), shape, build).MatchesAtStart(value.view());
+}
+
+/// A string property's comparison of its text with theirs, past the type test. With
+/// MATCH_REGEXP, `expression` is the search's expression built for theirs and these
+/// flags, or null to build (or reuse) it here.
+bool TextMatches(const Port::StringBase<char>& mine, const Port::StringBase<char>& theirs,
+                 int flags, const Port_Regexp* expression) {
+    if ((flags & VnI::MATCH_REGEXP) != 0 &&
+        (expression != nullptr ? expression->MatchesAtStart(mine.view())
+                               : RegexpMatches(mine, theirs, flags))) {
+        return true;
+    }
+    if (IsPlain(flags)) {
+        return mine == theirs;
+    }
+    const bool ignoreCase = (flags & VnI::MATCH_IGNORE_CASE) != 0;
+    const bool substring = (flags & VnI::MATCH_SUBSTRING) != 0;
+    if (substring) {
+        const auto type =
+            ignoreCase ? Port::StringBase<char>::kIgnoreCase : Port::StringBase<char>::kExact;
+        return mine.GetIndexOfString(theirs, type) != Port::StringBase<char>::npos;
+    }
+    if (ignoreCase) {
+        // Folding maps each byte to one byte, so texts of different lengths never match.
+        return mine.GetLength() == theirs.GetLength() &&
+               mine.Compare(theirs, Port::StringBase<char>::kIgnoreCase) == 0;
+    }
+    // Less, greater and within 5 % have no meaning for texts.
+    return false;
 }
 
 } // namespace
@@ -247,26 +277,7 @@ bool StringProperty::Equals(const CommonI::RefCountPtr<const VnI::IProperty>& ot
         return false;
     }
     Port::StringBase<char> spare;
-    const Port::StringBase<char>& theirs = TextOf(*other, spare);
-
-    if ((flags & VnI::MATCH_REGEXP) != 0 && RegexpMatches(m_value, theirs, flags)) {
-        return true;
-    }
-    if (IsPlain(flags)) {
-        return m_value == theirs;
-    }
-    const bool ignoreCase = (flags & VnI::MATCH_IGNORE_CASE) != 0;
-    const bool substring = (flags & VnI::MATCH_SUBSTRING) != 0;
-    if (substring) {
-        const auto type =
-            ignoreCase ? Port::StringBase<char>::kIgnoreCase : Port::StringBase<char>::kExact;
-        return m_value.GetIndexOfString(theirs, type) != Port::StringBase<char>::npos;
-    }
-    if (ignoreCase) {
-        return m_value.Compare(theirs, Port::StringBase<char>::kIgnoreCase) == 0;
-    }
-    // Less, greater and within 5 % have no meaning for texts.
-    return false;
+    return TextMatches(m_value, TextOf(*other, spare), flags, nullptr);
 }
 
 bool StringProperty::LessThan(const CommonI::RefCountPtr<const VnI::IProperty>& other, int) const {
@@ -369,6 +380,33 @@ void EnumeratedProperty::SetCurrentValue(Port::StringBase<char> value) {
         }
     }
     Port_MsgManData::debugStub("Tried to set value of Enumerated Property to invalid type\n");
+}
+
+//===-- PreparedTextMatch ---------------------------------------------------------===//
+
+detail::PreparedTextMatch::PreparedTextMatch(const VnI::IProperty* wanted, int flags)
+    : m_flags(flags) {
+    if (wanted == nullptr || typeid(*wanted) != typeid(StringProperty)) {
+        return;
+    }
+    m_wanted = static_cast<const StringProperty*>(wanted);
+    if ((flags & VnI::MATCH_REGEXP) != 0 && (flags & VnI::MATCH_ANY) == 0) {
+        m_expression.emplace(SearchExpression(
+            m_wanted->Value(), flags & (VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING)));
+    }
+}
+
+bool detail::PreparedTextMatch::Answers(const VnI::IProperty& candidate) const {
+    return m_wanted != nullptr && typeid(candidate) == typeid(StringProperty);
+}
+
+bool detail::PreparedTextMatch::Matches(const VnI::IProperty& candidate) const {
+    // StringProperty::Equals, its type test settled by the exact classes of both sides.
+    if ((m_flags & VnI::MATCH_ANY) != 0) {
+        return true;
+    }
+    return TextMatches(static_cast<const StringProperty&>(candidate).Value(), m_wanted->Value(),
+                       m_flags, m_expression ? &*m_expression : nullptr);
 }
 
 } // namespace Vn::Eng

@@ -4,6 +4,7 @@
 
 #include "s/FindItr.h"
 #include "s/GenericPropertyHolder.h"
+#include "s/Property.h"
 #include "s/PropertyFactory.h"
 #include "s/PropertyHolderItr.h"
 
@@ -174,6 +175,76 @@ TEST(FindItr, TheHoldersPropertyIsTheReceiverOfEachFlagFamily) {
     EXPECT_EQ(Search(h, "Name", Text("Ban.*2"), VnI::MATCH_REGEXP), (V{h[3]}));
     EXPECT_EQ(Search(h, "Name", Text("Ban"), VnI::MATCH_EXACT), (V{h[5]}));
     EXPECT_EQ(Search(h, "Name", Text("x"), VnI::MATCH_ANY), (V{h[3], h[4], h[5]}));
+}
+
+// A host's string property that decides equality itself.
+class AlwaysEqualText final : public Vn::Eng::StringProperty {
+public:
+    using StringProperty::StringProperty;
+    bool Equals(const RefCountPtr<const VnI::IProperty>&, int) const override { return true; }
+};
+
+// A host's string property that reports a text other than the one it was built with.
+class ReportedText final : public Vn::Eng::StringProperty {
+public:
+    ReportedText(const char* stored, const char* reported)
+        : StringProperty(StringBase<char>(stored)), m_reported(reported) {}
+    StringBase<char> GetStringProperty() const override { return m_reported; }
+
+private:
+    StringBase<char> m_reported;
+};
+
+TEST(FindItr, TextSearchesYieldWhatEachHoldersEqualsAnswers) {
+    Holders h;
+    for (const char* name : {"Bank12", "bank7", "Ban", "BANK3_pin9", "Bank3_", "xBank3_", "", "a.b",
+                             "Bank3_\n", "\xe9t\xe9", "\xc9T\xc9"}) {
+        h.Name(name);
+    }
+    const int shapes[] = {0,
+                          VnI::MATCH_EXACT,
+                          VnI::MATCH_IGNORE_CASE,
+                          VnI::MATCH_SUBSTRING,
+                          VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING,
+                          VnI::MATCH_REGEXP,
+                          VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE,
+                          VnI::MATCH_REGEXP | VnI::MATCH_SUBSTRING,
+                          VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING,
+                          VnI::MATCH_REGEXP | VnI::MATCH_EXACT,
+                          VnI::MATCH_ANY,
+                          VnI::MATCH_LESS};
+    for (const char* wanted :
+         {"BANK3_.*", "bank", "Ban", "a.b", "(", "ank\\d+", ".*_\n", "\xe9T", "", "x|Bank1"}) {
+        for (const int flags : shapes) {
+            std::vector<IPropertyHolder*> expected;
+            for (size_t i = 0; i < h.owned.size(); ++i) {
+                if (h[i]->GetPropertyByName("Name")->Equals(Wanted(Text(wanted)), flags)) {
+                    expected.push_back(h[i]);
+                }
+            }
+            EXPECT_EQ(Search(h, "Name", Text(wanted), flags), expected)
+                << wanted << " with flags " << flags;
+        }
+    }
+}
+
+TEST(FindItr, AHostsStringPropertyAnswersThroughItsOwnMethods) {
+    Holders h;
+    h.Name("Bank12").Name("bank7");
+    GenericPropertyHolder host;
+    host.AddProperty("Name", RefCountPtr<VnI::IProperty>::Adopt(new AlwaysEqualText("zzz")));
+    h.list.push_back(&host);
+    using V = std::vector<IPropertyHolder*>;
+    EXPECT_EQ(Search(h, "Name", Text("Ban.*"), VnI::MATCH_REGEXP), (V{h[0], &host}));
+    EXPECT_EQ(Search(h, "Name", Text("q"), VnI::MATCH_EXACT), (V{&host}));
+    // The wanted side's text is what it reports, not what it was built with.
+    const RefCountPtr<VnI::IProperty> reported =
+        RefCountPtr<VnI::IProperty>::Adopt(new ReportedText("nothing", "BANK1.*"));
+    EXPECT_EQ(Search(h, "Name", reported, VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE),
+              (V{h[0], &host}));
+    EXPECT_EQ(Search(h, "Name", RefCountPtr<VnI::IProperty>::Adopt(new ReportedText("x", "bank7")),
+                     VnI::MATCH_EXACT),
+              (V{h[1], &host}));
 }
 
 TEST(FindItr, AnswersItselfAndItsCounterAndHoldsItsArguments) {

@@ -58,14 +58,33 @@ TEST(PortRegexp, CopiesShareTheCompiledPatternAndBothMatch) {
 }
 
 TEST(PortRegexp, MatchesAtStartAgreesWithTheLeftmostMatch) {
-    for (const char* pattern : {"Ban", "ank", ".*ank.*", "x*", "[0-9]+", "(?i)bank", "("}) {
-        Port_Regexp re(pattern);
-        for (const char* text : {"Bank12", "", "12Bank", "bank"}) {
-            unsigned int start = 1;
-            const bool leftmostAtZero = re.Find(text, &start, nullptr) && start == 0;
-            EXPECT_EQ(re.MatchesAtStart(text), leftmostAtZero) << pattern << " on " << text;
+    // Patterns whose opening characters a match must start with, and the ways that
+    // opening ends: a repeat taking back its last character, an escape, a class, an
+    // alternation or a flag group that changes what the opening means, bytes past ASCII.
+    const char* const patterns[] = {
+        "Ban",      "ank",        ".*ank.*", "x*",       "[0-9]+",   "(?i)bank", "(",
+        "BANK1_.*", "^^bank",     "Bax*nk",  "Bank?1",   "Ban{1}k",  "Ban{0}k",  "Bank+1",
+        "Ba\\w",    "Ba[nN]k",    "x|Bank",  "B(?i)ANK", "Bank$",    "Bank1\\d", "\xe9t\xe9",
+        "\xc9T",    "bank1_pin7", "Bank\n",  "a{",       "Bank1_pin"};
+    const char* const texts[] = {"Bank12", "",           "12Bank", "bank",      "BANK1_x",
+                                 "Bank",   "bank1_pin7", "Bk",     "\xe9t\xe9", "\xc9t",
+                                 "Bank\n", "Bank1\n",    "Baxxnk", "Bak1",      "Bannk1"};
+    for (const auto letterCase : {Port_Regexp::Case::Match, Port_Regexp::Case::Ignore}) {
+        for (const char* pattern : patterns) {
+            Port_Regexp re(pattern, letterCase);
+            for (const char* text : texts) {
+                unsigned int start = 1;
+                const bool leftmostAtZero = re.Find(text, &start, nullptr) && start == 0;
+                EXPECT_EQ(re.MatchesAtStart(text), leftmostAtZero)
+                    << pattern << " on " << text << " ignoring case "
+                    << (letterCase == Port_Regexp::Case::Ignore);
+            }
         }
     }
+    // The opening compare folds ASCII letters only, as the expression does.
+    EXPECT_TRUE(Port_Regexp("bANK1_", Port_Regexp::Case::Ignore).MatchesAtStart("Bank1_pin"));
+    EXPECT_FALSE(Port_Regexp("\xe9t", Port_Regexp::Case::Ignore).MatchesAtStart("\xc9t"));
+    EXPECT_FALSE(Port_Regexp("bank1_", Port_Regexp::Case::Match).MatchesAtStart("Bank1_pin"));
 }
 
 TEST(PortRegexp, EveryByteIsOneCharacter) {
