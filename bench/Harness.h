@@ -28,6 +28,12 @@ const Sizes& GetSizes();
 std::uint64_t AllocatedBytes();
 /// Bytes the heap holds for operator new's blocks now, as malloc rounds them.
 std::int64_t LiveBytes();
+/// Starts counting, on this thread, the blocks allocated from now on that are still live,
+/// each as malloc rounds its request in a fresh heap. Unlike LiveBytes this does not
+/// depend on what earlier benchmarks left in the heap.
+void StartRoundedBytes();
+/// Stops the count and returns its bytes; -1 when there were too many blocks to follow.
+std::int64_t StopRoundedBytes();
 
 /// The sixteen property names the look-up measurements use, ours and the baselines alike.
 std::vector<std::string> SixteenNames();

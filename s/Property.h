@@ -167,9 +167,11 @@ protected:
     ~EnumeratedProperty() override = default;
 
 private:
+    // First, so that it fills the padding after the base's two small fields instead of
+    // lengthening every enumerated property by eight bytes.
+    std::uint32_t m_currentIndex = 0;
     std::vector<Port::StringBase<char>>* m_possibleValuesRef; // not owned
     Port::StringBase<char> m_currentValue;
-    std::uint32_t m_currentIndex = 0;
 };
 
 } // namespace Vn::Eng

@@ -4,10 +4,17 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstdint>
 #include <string>
+#include <utility>
 
 using Port::StringBase;
 using Str = StringBase<char>;
+
+namespace {
+constexpr unsigned int kWholeText = 0xFFFFFFFFu;
+}
 
 TEST(PortString, HoldsNulBytesAndComparesByLengthAndBytes) {
     const Str a("a\0b", 3);
@@ -107,4 +114,100 @@ TEST(PortString, RangeOfMatchIsInclusiveAndSaysWhenNothingMatched) {
     r = Str("").GetRangeOfMatch(Port_Regexp(".*"));
     EXPECT_EQ(r.first, 0u);
     EXPECT_GE(r.second, r.first);
+}
+
+// Texts up to kInlineCapacity bytes live in the object and longer ones on the heap; every
+// operation must give the same bytes on both sides of that line and across it.
+TEST(PortString, KeepsItsBytesAcrossTheInlineLimit) {
+    const std::size_t limit = Str::kInlineCapacity;
+    for (std::size_t n : {limit - 1, limit, limit + 1, 2 * limit + 3}) {
+        const std::string bytes = std::string(n - 1, 'q') + '\0';
+        Str text(bytes.data(), static_cast<unsigned int>(n));
+        ASSERT_EQ(text.GetLength(), n);
+        EXPECT_EQ(text.view(), bytes);
+        EXPECT_EQ(text.c_str()[n], '\0') << n;
+
+        Str copy(text);
+        Str moved(std::move(copy));
+        EXPECT_EQ(moved, text) << n;
+        EXPECT_TRUE(copy.IsEmpty()) << "a moved-from text is left empty"; // NOLINT
+        EXPECT_EQ(copy.c_str()[0], '\0');
+
+        Str assigned("x");
+        assigned = text;
+        EXPECT_EQ(assigned, text);
+        assigned = Str("short again");
+        EXPECT_EQ(assigned.view(), "short again") << "shrinking from " << n;
+    }
+}
+
+TEST(PortString, AppendsAndInsertsItsOwnBytes) {
+    // The source lies inside the text being changed: short, long, and growing past the
+    // inline limit while reading from the inline bytes.
+    for (std::size_t n : {5u, 30u, 47u, 60u}) {
+        const std::string start(n, 'a');
+        Str text(start.c_str());
+        text.Append(text.c_str(), kWholeText);
+        EXPECT_EQ(text.str(), start + start);
+
+        std::string model = start + start;
+        text.Insert(1, text.c_str() + 2, 3);
+        model.insert(1, model.substr(2, 3));
+        EXPECT_EQ(text.str(), model) << n;
+
+        text = text.c_str() + 1;
+        EXPECT_EQ(text.str(), model.substr(1)) << n;
+
+        text += text;
+        EXPECT_EQ(text.str(), model.substr(1) + model.substr(1)) << n;
+    }
+}
+
+// Random edits checked against std::string, with lengths that keep crossing the limit.
+TEST(PortString, AgreesWithStdStringOverRandomEdits) {
+    std::uint32_t seed = 12345;
+    const auto next = [&seed](std::uint32_t below) {
+        seed = seed * 1664525u + 1013904223u;
+        return (seed >> 8) % below;
+    };
+    Str text;
+    std::string model;
+    for (int step = 0; step < 4000; ++step) {
+        const std::string piece(next(40), static_cast<char>('a' + next(26)));
+        switch (next(6)) {
+        case 0:
+            text.Append(piece.data(), static_cast<unsigned int>(piece.size()));
+            model += piece;
+            break;
+        case 1: {
+            const auto at = next(static_cast<std::uint32_t>(model.size() + 5));
+            text.Insert(at, piece.c_str(), kWholeText);
+            model.insert(std::min<std::size_t>(at, model.size()), piece);
+            break;
+        }
+        case 2:
+            text = piece.c_str();
+            model = piece;
+            break;
+        case 3:
+            text.MakeUpper();
+            for (char& c : model) {
+                c = static_cast<char>(c >= 'a' && c <= 'z' ? c - 'a' + 'A' : c);
+            }
+            break;
+        case 4:
+            if (model.size() > 200) {
+                text.Clear();
+                model.clear();
+            }
+            break;
+        default: {
+            const Str copy = text;
+            text = copy;
+            break;
+        }
+        }
+        ASSERT_EQ(text.view(), model) << "step " << step;
+        ASSERT_EQ(text.c_str()[model.size()], '\0') << "step " << step;
+    }
 }

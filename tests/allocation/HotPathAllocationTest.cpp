@@ -5,6 +5,7 @@
 // comparison is a million allocations. These tests count them.
 //
 //===------------------------------------------------------------------------------===//
+#include "s/GenericPropertyHolder.h"
 #include "s/PropertyFactory.h"
 #include "s/PropertyNameList.h"
 
@@ -12,6 +13,7 @@
 
 #include <gtest/gtest.h>
 
+#include <string>
 #include <vector>
 
 using CommonI::RefCountPtr;
@@ -68,4 +70,46 @@ TEST(HotPathAllocations, NameLookupBuildsNoString) {
               0);
     EXPECT_EQ(found, 0);
     EXPECT_EQ(missing, -1);
+}
+
+// A host passes a literal, so every look-up builds a text from it: names up to the
+// documented inline limit must not cost an allocation anywhere on that road.
+TEST(HotPathAllocations, LookUpsByNamesUpToTheInlineLimitAllocateNothing) {
+    const std::string names[] = {std::string(16, 'n'), std::string(31, 'o'),
+                                 std::string(Port::StringBase<char>::kInlineCapacity, 'p')};
+    Vn::Eng::GenericPropertyHolder holder;
+    for (const std::string& name : names) {
+        ASSERT_EQ(holder.AddProperty(
+                      name.c_str(),
+                      RefCountPtr<IProperty>::Adopt(PropertyFactory::CreateIntProperty(1, true))),
+                  1);
+    }
+    const auto replacement =
+        RefCountPtr<IProperty>::Adopt(PropertyFactory::CreateIntProperty(2, true));
+    for (const std::string& name : names) {
+        const char* literal = name.c_str();
+        RefCountPtr<IProperty> found;
+        EXPECT_EQ(VnTest::AllocationsOf([&] {
+                      found = holder.GetPropertyByName(literal);
+                      holder.AddProperty(literal, replacement);
+                      (void)holder.GetPropertyNames()->Contains(literal);
+                      (void)Port::StringBase<char>(literal).Compare(literal,
+                                                                    Port::StringBase<char>::kExact);
+                  }),
+                  0)
+            << name.size() << " bytes";
+        EXPECT_TRUE(found) << name.size() << " bytes";
+    }
+    EXPECT_EQ(holder.GetPropertyByName(names[1].c_str()), replacement);
+    EXPECT_EQ(holder.GetNumProperties(), 3);
+}
+
+TEST(HotPathAllocations, ALongerNameAllocatesWhereTheLimitSays) {
+    const std::string name(Port::StringBase<char>::kInlineCapacity + 1, 'q');
+    Vn::Eng::GenericPropertyHolder holder;
+    holder.AddProperty(name.c_str(),
+                       RefCountPtr<IProperty>::Adopt(PropertyFactory::CreateIntProperty(1, true)));
+    RefCountPtr<IProperty> found;
+    EXPECT_GT(VnTest::AllocationsOf([&] { found = holder.GetPropertyByName(name.c_str()); }), 0);
+    EXPECT_TRUE(found);
 }

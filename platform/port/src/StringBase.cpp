@@ -7,6 +7,9 @@
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
+#include <functional>
+#include <stdexcept>
+#include <string>
 
 namespace Port {
 
@@ -42,22 +45,118 @@ size_t CLength(const char* text, unsigned int n) {
     return n == StringBase<char>::npos ? std::strlen(text) : n;
 }
 
+// Lengths are 32-bit and 0xFFFFFFFF is kept for "absent", as std::string keeps npos.
+void CheckLength(std::size_t n) {
+    if (n >= StringBase<char>::npos) {
+        throw std::length_error("Port::StringBase: text longer than 4294967294 bytes");
+    }
+}
+
 } // namespace
 
-StringBase<char>::StringBase(const char* text) : m_text(text != nullptr ? text : "") {}
+StringBase<char>::StringBase(const char* text) {
+    SetInline(0);
+    if (text != nullptr) {
+        Assign(text, std::strlen(text));
+    }
+}
 
-StringBase<char>::StringBase(const char* text, unsigned int length)
-    : m_text(text != nullptr ? std::string(text, length) : std::string()) {}
+StringBase<char>::StringBase(const char* text, unsigned int length) {
+    SetInline(0);
+    if (text != nullptr) {
+        Assign(text, length);
+    }
+}
 
-StringBase<char>::StringBase(std::string_view text) : m_text(text) {}
+StringBase<char>::StringBase(std::string_view text) {
+    SetInline(0);
+    Assign(text.data(), text.size());
+}
+
+void StringBase<char>::SetLength(unsigned int length) {
+    if (OnHeap()) {
+        std::memcpy(m_bytes + kLengthAt, &length, sizeof length);
+        HeapData()[length] = '\0';
+    } else {
+        SetInline(length);
+    }
+}
+
+void StringBase<char>::CopyLong(const StringBase& other) {
+    const unsigned int length = other.HeapLength();
+    char* block = new char[std::size_t{length} + 1];
+    std::memcpy(block, other.HeapData(), std::size_t{length} + 1);
+    SetHeap(block, length, length);
+}
+
+void StringBase<char>::Assign(const char* text, std::size_t n) {
+    CheckLength(n);
+    if (n <= kInlineCapacity) {
+        // text may lie in this very text, inline or in the block freed below.
+        char* old = OnHeap() ? HeapData() : nullptr;
+        if (n != 0) {
+            std::memmove(m_bytes, text, n);
+        }
+        SetInline(static_cast<unsigned int>(n));
+        delete[] old;
+        return;
+    }
+    if (OnHeap() && n <= Capacity()) {
+        std::memmove(HeapData(), text, n);
+        SetLength(static_cast<unsigned int>(n));
+        return;
+    }
+    char* block = new char[n + 1];
+    std::memcpy(block, text, n);
+    block[n] = '\0';
+    if (OnHeap()) {
+        delete[] HeapData();
+    }
+    SetHeap(block, static_cast<unsigned int>(n), static_cast<unsigned int>(n));
+}
+
+void StringBase<char>::Splice(std::size_t at, const char* text, std::size_t n) {
+    if (n == 0) {
+        return;
+    }
+    const std::size_t length = GetLength();
+    CheckLength(length + n);
+    const std::size_t total = length + n;
+    char* here = OnHeap() ? HeapData() : m_bytes;
+    if (total <= Capacity()) {
+        const std::less<const char*> before;
+        if (!before(text, here) && before(text, here + length + 1)) {
+            // Moving the tail would shift the very bytes to insert: take them aside.
+            const StringBase aside(std::string_view(text, n));
+            Splice(at, aside.data(), n);
+            return;
+        }
+        std::memmove(here + at + n, here + at, length - at);
+        std::memcpy(here + at, text, n);
+        SetLength(static_cast<unsigned int>(total));
+        return;
+    }
+    // Geometric growth keeps a run of appends linear.
+    const std::size_t capacity =
+        std::max<std::size_t>(total, std::min<std::size_t>(2 * std::size_t{Capacity()}, npos - 1));
+    char* block = new char[capacity + 1];
+    std::memcpy(block, here, at);
+    std::memcpy(block + at, text, n);
+    std::memcpy(block + at + n, here + at, length - at);
+    block[total] = '\0';
+    if (OnHeap()) {
+        delete[] HeapData();
+    }
+    SetHeap(block, static_cast<unsigned int>(total), static_cast<unsigned int>(capacity));
+}
 
 StringBase<char>& StringBase<char>::operator=(const char* text) {
-    m_text.assign(text != nullptr ? text : "");
+    Assign(text != nullptr ? text : "", text != nullptr ? std::strlen(text) : 0);
     return *this;
 }
 
 StringBase<char>& StringBase<char>::operator+=(const StringBase& other) {
-    m_text += other.m_text;
+    Splice(GetLength(), other.data(), other.GetLength());
     return *this;
 }
 
@@ -66,60 +165,66 @@ StringBase<char>& StringBase<char>::operator+=(const char* text) {
 }
 
 StringBase<char>& StringBase<char>::Append(const char* text, unsigned int n) {
-    m_text.append(text != nullptr ? text : "", CLength(text, n));
+    if (text != nullptr) {
+        Splice(GetLength(), text, CLength(text, n));
+    }
     return *this;
 }
 
 StringBase<char>& StringBase<char>::Insert(unsigned int pos, const char* text, unsigned int n) {
-    const size_t at = std::min<size_t>(pos, m_text.size());
-    m_text.insert(at, text != nullptr ? text : "", CLength(text, n));
+    if (text != nullptr) {
+        Splice(std::min<std::size_t>(pos, GetLength()), text, CLength(text, n));
+    }
     return *this;
 }
 
 int StringBase<char>::Compare(const StringBase& other, CompareType type) const {
-    return CompareBytes(m_text, other.m_text, type == kIgnoreCase);
+    return CompareBytes(view(), other.view(), type == kIgnoreCase);
 }
 
 unsigned int StringBase<char>::GetIndexOfString(const StringBase& other, CompareType type) const {
+    const std::string_view text = view();
+    const std::string_view wanted = other.view();
     if (type != kIgnoreCase) {
-        const size_t at = m_text.find(other.m_text);
-        return at == std::string::npos ? npos : static_cast<unsigned int>(at);
+        const size_t at = text.find(wanted);
+        return at == std::string_view::npos ? npos : static_cast<unsigned int>(at);
     }
     const auto equal = [](char a, char b) {
         return FoldCase(static_cast<unsigned char>(a)) == FoldCase(static_cast<unsigned char>(b));
     };
-    const auto it =
-        std::search(m_text.begin(), m_text.end(), other.m_text.begin(), other.m_text.end(), equal);
-    return it == m_text.end() && !other.m_text.empty()
-               ? npos
-               : static_cast<unsigned int>(it - m_text.begin());
+    const auto it = std::search(text.begin(), text.end(), wanted.begin(), wanted.end(), equal);
+    return it == text.end() && !wanted.empty() ? npos
+                                               : static_cast<unsigned int>(it - text.begin());
 }
 
 StringBase<char>& StringBase<char>::MakeUpper() {
-    for (char& c : m_text) {
-        c = static_cast<char>(FoldCase(static_cast<unsigned char>(c)));
+    char* here = OnHeap() ? HeapData() : m_bytes;
+    for (char* c = here; c != here + GetLength(); ++c) {
+        *c = static_cast<char>(FoldCase(static_cast<unsigned char>(*c)));
     }
     return *this;
 }
 
 StringBase<char>& StringBase<char>::Format(const char* format, ...) {
     if (format == nullptr) {
-        m_text.clear();
+        Clear();
         return *this;
     }
     va_list args;
     va_start(args, format);
     va_list again;
     va_copy(again, args);
-    const int needed = std::vsnprintf(nullptr, 0, format, args);
+    char small[kInlineCapacity + 1];
+    const int needed = std::vsnprintf(small, sizeof small, format, args);
     va_end(args);
     if (needed < 0) {
-        m_text.clear();
+        Clear();
+    } else if (static_cast<std::size_t>(needed) < sizeof small) {
+        Assign(small, static_cast<std::size_t>(needed));
     } else {
         std::string out(static_cast<size_t>(needed) + 1, '\0');
         std::vsnprintf(out.data(), out.size(), format, again);
-        out.resize(static_cast<size_t>(needed));
-        m_text = std::move(out);
+        Assign(out.data(), static_cast<size_t>(needed));
     }
     va_end(again);
     return *this;
@@ -128,7 +233,7 @@ StringBase<char>& StringBase<char>::Format(const char* format, ...) {
 Port_Range StringBase<char>::GetRangeOfMatch(const Port_Regexp& regexp) const {
     unsigned int start = 0;
     unsigned int length = 0;
-    if (!regexp.Find(m_text, &start, &length)) {
+    if (!regexp.Find(view(), &start, &length)) {
         return Port_Range{npos, 0};
     }
     // Inclusive end; an empty match at 0 wraps to 0xFFFFFFFF and so still starts at 0.
@@ -136,12 +241,12 @@ Port_Range StringBase<char>::GetRangeOfMatch(const Port_Regexp& regexp) const {
 }
 
 bool StringBase<char>::GetUINT32(const Port_Range& range, unsigned int* value) const {
-    if (value == nullptr || range.first > range.second || range.second >= m_text.size()) {
+    if (value == nullptr || range.first > range.second || range.second >= GetLength()) {
         return false;
     }
     std::uint64_t number = 0;
     for (size_t i = range.first; i <= range.second; ++i) {
-        const char c = m_text[i];
+        const char c = data()[i];
         if (c < '0' || c > '9') {
             return false;
         }
