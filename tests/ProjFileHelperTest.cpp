@@ -10,6 +10,7 @@
 
 #include "CitP/Factory.h"
 #include "MessageCapture.h"
+#include "ProjectDescription.h"
 #include "hostproj/Components.h"
 
 #include <gmock/gmock.h>
@@ -19,6 +20,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -247,6 +249,88 @@ unit t DESUT_NGD "/d/" "second.ngd"
     EXPECT_EQ(result.ucf, "/d/second.ucf");
     EXPECT_EQ(result.ngd, "/d/second.ngd");
     ExpectEverythingReleased();
+}
+
+TEST_F(ProjectLookup, LetsALaterUnitOverwriteOneThatNamedItsViewBeforeTheDeclaration) {
+    // The first unit waits for its view; the second, read once the view is known, must
+    // still come after it.
+    Describe(R"(project p.zam
+unit a DESUT_UCF "/d/" "first.ucf"
+unit t DESUT_NGD "/d/" "first.ngd"
+view a VIEW_Synthesis
+view t VIEW_Translation
+default a
+unit a DESUT_UCF "/d/" "second.ucf"
+binding a t
+unit t DESUT_NGD "/d/" "second.ngd"
+)");
+    const Lookup result = Run();
+    EXPECT_TRUE(result.found);
+    EXPECT_EQ(result.ucf, "/d/second.ucf");
+    EXPECT_EQ(result.ngd, "/d/second.ngd");
+    ExpectEverythingReleased();
+}
+
+// The parsed views, one line each: name, units' files in order, bindings' views in order.
+std::string Render(const SampleHost::Description& description) {
+    std::string text;
+    for (const auto& view : description.views) {
+        text += view.name + ":";
+        for (const auto& unit : view.units) {
+            text += " " + unit.typeId + "=" + unit.directory + unit.file;
+        }
+        for (const auto& produced : view.bindings) {
+            text += " [";
+            for (std::size_t index : produced) {
+                text += " " + description.views.at(index).name;
+            }
+            text += " ]";
+        }
+        text += "\n";
+    }
+    return text;
+}
+
+TEST(ProjectDescription, KeepsFileOrderWhereLinesNameAViewAboveAndBelowItsDeclaration) {
+    // On view a: lines before its declaration, lines after it that must queue behind
+    // those, and a binding waiting for a view further down. On b: a binding filed at once,
+    // then one that waits, then one that could be filed at once but must not overtake.
+    // On c: a unit filed at once only because nothing of c's waits.
+    const std::string text = R"(project p.zam
+unit a DESUT_VHDL "/d/" "1.vhd"
+binding a t
+view a VIEW_Synthesis
+view b
+binding b a
+unit a DESUT_UCF "/d/" "2.ucf"
+binding a b
+binding b t
+view c
+unit c DESUT_UCF "/d/" "3.ucf"
+binding a b t
+view t VIEW_Translation
+binding b a
+unit a DESUT_VERILOG "/d/" "4.v"
+binding a t
+unit c DESUT_NGD "/d/" "5.ngd"
+binding c a b
+default c
+)";
+    const std::string expected = "a: DESUT_VHDL=/d/1.vhd DESUT_UCF=/d/2.ucf DESUT_VERILOG=/d/4.v"
+                                 " [ t ] [ b ] [ b t ] [ t ]\n"
+                                 "b: [ a ] [ t ] [ a ]\n"
+                                 "c: DESUT_UCF=/d/3.ucf DESUT_NGD=/d/5.ngd [ a b ]\n"
+                                 "t:\n";
+    SampleHost::Description whole, streamed;
+    SampleHost::ParseError error;
+    ASSERT_TRUE(SampleHost::ParseDescription(text, whole, error)) << error.line << error.what;
+    std::istringstream lines(text);
+    ASSERT_TRUE(SampleHost::ParseDescription(lines, streamed, error)) << error.line << error.what;
+    for (const auto* description : {&whole, &streamed}) {
+        EXPECT_EQ(Render(*description), expected);
+        EXPECT_TRUE(description->hasDefault);
+        EXPECT_EQ(description->defaultView, 2u);
+    }
 }
 
 TEST_F(ProjectLookup, StopsScanningOnceBothSlotsHoldANameAndDeliversTheSameNames) {

@@ -14,6 +14,8 @@
 
 #include <sys/stat.h>
 
+#include <stdexcept>
+
 using VnTest::DesignSpec;
 using VnTest::ExecSql;
 using VnTest::GoodDesign;
@@ -391,12 +393,24 @@ void ExpectRefusedAsFormat(const std::string& path, const std::string& words) {
 
 } // namespace
 
+TEST_F(NetlistFiles, TheLargeNgdWriterThrowsWhereItCannotWriteAWholeFile) {
+    // The benchmarks have no test framework to stop them: a file the writer could not
+    // finish must be an exception, never a half-written input measured as if whole.
+    EXPECT_THROW(VnTest::WriteLargeNgd(PathOf("missing/large.ngd"), 10, 0, 0), std::runtime_error);
+    const std::string existing = PathOf("existing.ngd");
+    ASSERT_NO_THROW(VnTest::WriteLargeNgd(existing, 10, 2, 3));
+    EXPECT_THROW(VnTest::WriteLargeNgd(existing, 10, 0, 0), std::runtime_error);
+    const auto model = ReadNetlist(existing);
+    ASSERT_NE(model, nullptr);
+    EXPECT_EQ(model->GetDesignMgr()->GetNumDesigns(), 10u);
+}
+
 TEST_F(NetlistFiles, ALargeNgdIsReadInTimeProportionalToItsSize) {
     // A reader that looked for duplicates by walking what it had read so far would take
     // many minutes here: 100,000 designs, 50,000 views of one design and 50,000
     // properties of one view.
     const std::string path = PathOf("large.ngd");
-    VnTest::WriteLargeNgd(path, 100000, 50000, 50000);
+    ASSERT_NO_THROW(VnTest::WriteLargeNgd(path, 100000, 50000, 50000));
     EXPECT_EQ(Nhlp_FileConv::CanRead(path.c_str()), Nhlp_FileConv::FILE_READABLE);
     {
         const auto model = ReadNetlist(path);

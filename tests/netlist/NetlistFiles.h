@@ -1,6 +1,7 @@
 //===-- tests/netlist/NetlistFiles.h - netlist files as our writer and others write them -===//
 #pragma once
 
+#include "LargeNgd.h"
 #include "designmodel/Nhlp_FileConv.h"
 #include "designmodel/Nmod_Model.h"
 #include "designmodel/Nmod_Testing.h"
@@ -72,85 +73,6 @@ inline void ExecSql(const std::string& path, const char* sql) {
     sqlite3_free(error);
     sqlite3_close(db);
     ASSERT_EQ(rc, SQLITE_OK) << words;
-}
-
-/// The tables of a netlist file as another program may declare them: the same columns,
-/// without STRICT and without uniqueness, so that values of any type and duplicate names
-/// can be stored.
-inline constexpr const char* kOutsideSchema = R"sql(
-CREATE TABLE nmod_format (id INTEGER PRIMARY KEY, kind TEXT, version INTEGER,
-                          model_name TEXT, tool TEXT, tool_version TEXT);
-CREATE TABLE nmod_design (id INTEGER PRIMARY KEY, name TEXT);
-CREATE TABLE nmod_view (id INTEGER PRIMARY KEY, design_id INTEGER, name TEXT);
-CREATE TABLE nmod_view_property (view_id INTEGER, name TEXT, value TEXT);
-CREATE TABLE nmod_block (id INTEGER PRIMARY KEY, view_id INTEGER, name TEXT, type INTEGER);
-)sql";
-
-/// Writes, as another program would and fast enough for files of any size, an NGD of
-/// `designs` designs D0, D1, ...: each has an EXPANDED view naming part P0, P1, ... with
-/// a root block B0, B1, .... Design D0 has `extraViews` more views V0, V1, ..., and its
-/// EXPANDED view `extraProperties` more properties N0 = v0, N1 = v1, .... Rows get ids in
-/// that order (design 1 is D0, view 1 its EXPANDED view). Used by the tests and the
-/// benchmarks of reading large files.
-inline void WriteLargeNgd(const std::string& path, long designs, long extraViews,
-                          long extraProperties) {
-    sqlite3* db = nullptr;
-    ASSERT_EQ(
-        sqlite3_open_v2(path.c_str(), &db, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE, nullptr),
-        SQLITE_OK);
-    const auto exec = [db](const std::string& sql) {
-        ASSERT_EQ(sqlite3_exec(db, sql.c_str(), nullptr, nullptr, nullptr), SQLITE_OK)
-            << sqlite3_errmsg(db) << "\n"
-            << sql;
-    };
-    exec("PRAGMA journal_mode = OFF; PRAGMA synchronous = OFF; BEGIN;");
-    exec(kOutsideSchema);
-    exec("INSERT INTO nmod_format VALUES (1, 'NGD', " + std::to_string(Nmod_Model::kFormatVersion) +
-         ", 'large', 'venlomer-tests', '1')");
-    const auto insertAll = [&](const char* sql, long count, auto bind) {
-        sqlite3_stmt* row = nullptr;
-        ASSERT_EQ(sqlite3_prepare_v2(db, sql, -1, &row, nullptr), SQLITE_OK) << sqlite3_errmsg(db);
-        for (long i = 0; i < count; ++i) {
-            bind(row, i);
-            ASSERT_EQ(sqlite3_step(row), SQLITE_DONE) << sqlite3_errmsg(db);
-            sqlite3_reset(row);
-        }
-        sqlite3_finalize(row);
-    };
-    const auto text = [](sqlite3_stmt* row, int column, const std::string& value) {
-        sqlite3_bind_text(row, column, value.data(), static_cast<int>(value.size()),
-                          SQLITE_TRANSIENT);
-    };
-    const auto number = [](long i) { return std::to_string(i); };
-    insertAll("INSERT INTO nmod_design(id, name) VALUES (?, ?)", designs,
-              [&](sqlite3_stmt* row, long i) {
-                  sqlite3_bind_int64(row, 1, i + 1);
-                  text(row, 2, "D" + number(i));
-              });
-    insertAll("INSERT INTO nmod_view(id, design_id, name) VALUES (?, ?, 'EXPANDED')", designs,
-              [&](sqlite3_stmt* row, long i) {
-                  sqlite3_bind_int64(row, 1, i + 1);
-                  sqlite3_bind_int64(row, 2, i + 1);
-              });
-    insertAll("INSERT INTO nmod_view(design_id, name) VALUES (1, ?)", extraViews,
-              [&](sqlite3_stmt* row, long i) { text(row, 1, "V" + number(i)); });
-    insertAll("INSERT INTO nmod_view_property(view_id, name, value) VALUES (?, 'PART', ?)", designs,
-              [&](sqlite3_stmt* row, long i) {
-                  sqlite3_bind_int64(row, 1, i + 1);
-                  text(row, 2, "P" + number(i));
-              });
-    insertAll("INSERT INTO nmod_view_property(view_id, name, value) VALUES (1, ?, ?)",
-              extraProperties, [&](sqlite3_stmt* row, long i) {
-                  text(row, 1, "N" + number(i));
-                  text(row, 2, "v" + number(i));
-              });
-    insertAll("INSERT INTO nmod_block(view_id, name, type) VALUES (?, ?, 0)", designs,
-              [&](sqlite3_stmt* row, long i) {
-                  sqlite3_bind_int64(row, 1, i + 1);
-                  text(row, 2, "B" + number(i));
-              });
-    exec("COMMIT");
-    ASSERT_EQ(sqlite3_close(db), SQLITE_OK);
 }
 
 inline std::unique_ptr<Nmod_Model> ReadNetlist(const std::string& path) {

@@ -279,6 +279,30 @@ TEST_F(NetlistStubs, CreateNgcWritesTheFourTextsAndNeverReplacesAFile) {
     EXPECT_FALSE(Utilities::CreateNGC("", "D", "P", "B"));
 }
 
+TEST_F(NetlistStubs, ALinkPlantedUnderTheStubsNameIsNeitherFollowedNorReplaced) {
+    const std::string victim = PathOf("victim.txt");
+    WriteFile(victim, "the planter's target");
+    const std::string toFile = PathOf("to-file.ngc");
+    std::filesystem::create_symlink(victim, toFile);
+    // A link to nothing would create the file it names if the write followed it.
+    const std::string toNothing = PathOf("to-nothing.ngc");
+    std::filesystem::create_symlink(PathOf("created.txt"), toNothing);
+
+    for (const std::string& ngc : {toFile, toNothing}) {
+        SCOPED_TRACE(ngc);
+        VnTest::MessageCapture capture;
+        EXPECT_FALSE(Utilities::CreateNGC(ngc.c_str(), "D", "P", "B"));
+        ASSERT_EQ(capture.Errors().size(), 1u);
+        EXPECT_NE(capture.Errors()[0].find("exists already"), std::string::npos)
+            << capture.Errors()[0];
+        EXPECT_TRUE(std::filesystem::is_symlink(ngc));
+    }
+    EXPECT_EQ(VnTest::ReadFile(victim), "the planter's target");
+    EXPECT_EQ(FolderContents(),
+              (std::vector<std::string>{"to-file.ngc", "to-nothing.ngc", "victim.txt"}))
+        << "no temporary is left and nothing is created through a link";
+}
+
 TEST_F(NetlistStubs, AStubThatFailsWhileBeingWrittenLeavesNoFile) {
     const std::string ngc = PathOf("top.ngc");
     long failures = 0;

@@ -492,4 +492,84 @@ TEST_F(FileSafety, PeakMemoryStaysASmallMultipleOfTheChipDatabase) {
     EXPECT_TRUE(WholeSvg(Slurp(m_dir / "big.svg")));
 }
 
+// The peak resident size of one run of the tool with `args` (reported in `status`), its
+// standard output kept in `output`; `environment` is set in the child only.
+std::uintmax_t PeakOfRun(const std::vector<std::string>& args, const fs::path& output, int& status,
+                         const std::vector<std::pair<std::string, std::string>>& environment = {}) {
+    const pid_t child = ::fork();
+    if (child == 0) {
+        for (const auto& [name, value] : environment) {
+            ::setenv(name.c_str(), value.c_str(), 1);
+        }
+        const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+        const int devnull = ::open("/dev/null", O_WRONLY);
+        ::dup2(out, 1);
+        ::dup2(devnull, 2);
+        std::vector<char*> argv{const_cast<char*>("venlomer")};
+        for (const auto& arg : args) {
+            argv.push_back(const_cast<char*>(arg.c_str()));
+        }
+        argv.push_back(nullptr);
+        ::execv(VENLOMER_TOOL_PATH, argv.data());
+        ::_exit(127);
+    }
+    int raw = 0;
+    struct rusage usage {};
+    EXPECT_EQ(::wait4(child, &raw, 0, &usage), child);
+    status = WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+    return static_cast<std::uintmax_t>(usage.ru_maxrss) * 1024;
+}
+
+TEST_F(FileSafety, PeakMemoryStaysASmallMultipleOfTheProjectDescription) {
+#if defined(__SANITIZE_ADDRESS__)
+    GTEST_SKIP() << "the sanitizer's allocator keeps freed memory in quarantine";
+#endif
+    // A large project: views with their units, each bound to the one netlist view, and
+    // the default view named at the end.
+    const fs::path description = m_dir / "big.prj";
+    {
+        std::ofstream out(description, std::ios::binary);
+        out << "project \"/work/top/top.zam\"\nview xlate VIEW_Translation\n"
+               "unit xlate DESUT_NGD \"/work/top/\" \"top.ngd\"\n";
+        for (long i = 0; out.tellp() < (20 << 20); ++i) {
+            out << "view synth" << i << " VIEW_Synthesis\nunit synth" << i
+                << " DESUT_UCF \"/work/top/\" \"top" << i << ".ucf\"\nunit synth" << i
+                << " DESUT_VERILOG \"/work/top/src/\" \"block" << i << ".v\"\nbinding synth" << i
+                << " xlate\n";
+        }
+        out << "default synth0\n";
+    }
+    const auto input = fs::file_size(description);
+    int status = -1;
+    const auto peak =
+        PeakOfRun({"project-files", "--project", description.string()}, m_dir / "out", status);
+    EXPECT_EQ(status, 0);
+    EXPECT_LE(peak, 3 * input + (32u << 20)) << "peak " << peak << " for " << input;
+    EXPECT_EQ(Slurp(m_dir / "out"), "Project file:     /work/top/top.zam\n"
+                                    "Constraints file: /work/top/top0.ucf\n"
+                                    "Netlist database: /work/top/top.ngd\n");
+}
+
+TEST_F(FileSafety, PeakMemoryStaysASmallMultipleOfTheColourScheme) {
+#if defined(__SANITIZE_ADDRESS__)
+    GTEST_SKIP() << "the sanitizer's allocator keeps freed memory in quarantine";
+#endif
+    // The bundled scheme with its generic colour list grown to tens of megabytes.
+    std::string scheme = Slurp(fs::path(VENLOMER_DATA_DIR) / "rareroded.acd");
+    const std::size_t list = scheme.find("\nGENERIC_COLORS =");
+    ASSERT_NE(list, std::string::npos);
+    std::string more;
+    while (more.size() < (20u << 20)) {
+        more += " : 68,119,170 : 102,204,238 : 34,136,51 : 204,187,68";
+    }
+    scheme.insert(scheme.find('\n', list + 1), more);
+    WriteBytes(m_dir / "rareroded.acd", scheme);
+    const auto input = fs::file_size(m_dir / "rareroded.acd");
+    int status = -1;
+    const auto peak =
+        PeakOfRun({"colors"}, m_dir / "out", status, {{"VENLOMER_DATA_PATH", m_dir.string()}});
+    EXPECT_EQ(status, 0);
+    EXPECT_LE(peak, 4 * input + (64u << 20)) << "peak " << peak << " for " << input;
+}
+
 } // namespace

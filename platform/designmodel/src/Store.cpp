@@ -7,13 +7,7 @@
 #include "designmodel/Nmod_Exception.h"
 #include "designmodel/Nmod_Model.h"
 
-#include <atomic>
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
-#include <fcntl.h>
-#include <filesystem>
-#include <unistd.h>
+#include <sys/stat.h>
 
 namespace Nmod_Detail {
 
@@ -23,8 +17,18 @@ std::string Quoted(const std::string& text) {
     return "\"" + text + "\"";
 }
 
-[[noreturn]] void FailSystem(const std::string& context, int error) {
-    throw Nmod_Exception::Database(context + ": " + std::strerror(error), SQLITE_CANTOPEN);
+bool Exists(const std::string& path) {
+    struct stat info {};
+    return ::lstat(path.c_str(), &info) == 0;
+}
+
+// The writer's reason, which names the file as given, as this library words it.
+std::string CannotWrite(const std::string& finalPath, std::string why) {
+    const std::string prefix = "cannot write " + finalPath + ": ";
+    if (why.rfind(prefix, 0) == 0) {
+        why.erase(0, prefix.size());
+    }
+    return "cannot write netlist database " + Quoted(finalPath) + ": " + why;
 }
 
 } // namespace
@@ -65,28 +69,25 @@ void Store::RefuseAfterFailure() const {
 }
 
 void Store::MakePrivateFile() {
-    static std::atomic<unsigned long> s_serial{0};
-    const std::filesystem::path final(m_finalPath);
-    std::string base = final.filename().string();
-    // Keep the private name within the folder's name length whatever the final name.
-    if (base.size() > 160) {
-        base.resize(160);
-    }
-    for (int attempt = 0;; ++attempt) {
-        const std::string name =
-            "." + base + ".tmp-" + std::to_string(::getpid()) + "-" + std::to_string(s_serial++);
-        m_tempPath = (final.parent_path() / name).string();
-        const int fd = ::open(m_tempPath.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666);
-        if (fd >= 0) {
-            ::close(fd);
-            return;
+    const auto mode =
+        m_overwrite ? Port::SafeWriter::Mode::Replace : Port::SafeWriter::Mode::CreateOnly;
+    std::string why;
+    if (!m_writer.emplace().Open(m_finalPath, why, {}, mode)) {
+        if (!m_overwrite && Exists(m_finalPath)) {
+            // A dangling link or a file that came after the caller looked: never followed.
+            throw Nmod_Exception::Usage("netlist database " + Quoted(m_finalPath) +
+                                        " exists already; it was left as it is");
         }
-        const int error = errno;
-        if (error != EEXIST || attempt >= 100) {
-            m_tempPath.clear();
-            FailSystem("cannot write netlist database " + Quoted(m_finalPath), error);
-        }
+        throw Nmod_Exception::Database(CannotWrite(m_finalPath, why), SQLITE_CANTOPEN);
     }
+    if (m_writer->Direct()) {
+        // A database is written by name and read back by pages: a device or a pipe
+        // cannot hold one.
+        throw Nmod_Exception::Database("cannot write netlist database " + Quoted(m_finalPath) +
+                                           ": not a regular file",
+                                       SQLITE_CANTOPEN);
+    }
+    m_tempPath = m_writer->WorkingPath();
 }
 
 void Store::Exec(const char* sql) {
@@ -153,8 +154,6 @@ void Store::Finish() {
             Exec("COMMIT");
             m_db.Close("cannot finish netlist database " + Quoted(m_finalPath));
             CountWriteStep();
-            SyncPrivateFile();
-            CountWriteStep();
             RunBeforeMoveHook(m_finalPath);
             MoveIntoPlace();
         });
@@ -163,66 +162,26 @@ void Store::Finish() {
         throw;
     }
     m_done = true;
-    // The move is only as durable as the folder entry that records it.
-    const std::filesystem::path folder = std::filesystem::path(m_finalPath).parent_path();
-    const int fd =
-        ::open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    if (fd >= 0) {
-        ::fsync(fd);
-        ::close(fd);
-    }
-}
-
-void Store::SyncPrivateFile() {
-    // The move must not reach the disk before the content it names: after a crash the
-    // final name would hold a file with pages missing.
-    const int fd = ::open(m_tempPath.c_str(), O_RDONLY | O_CLOEXEC);
-    if (fd < 0 || ::fsync(fd) != 0) {
-        const int error = errno;
-        if (fd >= 0) {
-            ::close(fd);
-        }
-        throw Nmod_Exception::Database("cannot finish netlist database " + Quoted(m_finalPath) +
-                                           ": " + std::strerror(error),
-                                       SQLITE_IOERR);
-    }
-    ::close(fd);
 }
 
 void Store::MoveIntoPlace() {
-    const std::string context = "cannot put netlist database " + Quoted(m_finalPath) + " in place";
-    if (m_overwrite) {
-        if (std::rename(m_tempPath.c_str(), m_finalPath.c_str()) != 0) {
-            FailSystem(context, errno);
-        }
+    std::string why;
+    if (m_writer->Commit(why)) {
         return;
     }
-    // Never replace a file that appeared under the final name since Create: another run
-    // may have finished first, and its file is as good as ours.
-    if (::renameat2(AT_FDCWD, m_tempPath.c_str(), AT_FDCWD, m_finalPath.c_str(),
-                    RENAME_NOREPLACE) == 0) {
-        return;
-    }
-    int error = errno;
-    if (error == EINVAL || error == ENOSYS || error == ENOTSUP) {
-        // File systems without the no-replace move still refuse to link over a file.
-        if (::link(m_tempPath.c_str(), m_finalPath.c_str()) == 0) {
-            ::unlink(m_tempPath.c_str());
-            return;
-        }
-        error = errno;
-    }
-    if (error == EEXIST) {
+    // Another run may have finished first, and its file is as good as ours.
+    if (!m_overwrite && Exists(m_finalPath)) {
         throw Nmod_Exception::Usage("netlist database " + Quoted(m_finalPath) +
                                     " appeared while it was being written; it was left as it is");
     }
-    FailSystem(context, error);
+    throw Nmod_Exception::Database(
+        "cannot put netlist database " + Quoted(m_finalPath) + " in place: " + why, SQLITE_IOERR);
 }
 
 void Store::Discard() noexcept {
     m_db.Abandon();
-    if (!m_done && !m_tempPath.empty()) {
-        ::unlink(m_tempPath.c_str());
+    if (!m_done) {
+        m_writer.reset();
         m_tempPath.clear();
     }
 }

@@ -9,12 +9,16 @@
 
 #include "Engine.h"
 
+#include "Port/SafeFile.h"
+
+#include <optional>
 #include <string>
 
 namespace Nmod_Detail {
 
 /// The file a writing model fills: a private file beside the final one, one database
-/// transaction, and the move into place at the end.
+/// transaction, and the move into place at the end. Without `overwrite` the move never
+/// replaces a file that took the final name in the meantime.
 class Store {
 public:
     Store(const std::string& finalPath, bool ngd, bool overwrite, const std::string& modelName,
@@ -52,10 +56,10 @@ private:
     [[noreturn]] void RefuseAfterFailure() const;
     void Exec(const char* sql);
     void MakePrivateFile();
-    void SyncPrivateFile();
     void MoveIntoPlace();
 
     std::string m_finalPath;
+    std::optional<Port::SafeWriter> m_writer; // the private file and its publication
     std::string m_tempPath;
     bool m_overwrite;
     Connection m_db;

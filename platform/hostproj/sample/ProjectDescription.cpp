@@ -5,8 +5,11 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
+#include <functional>
+#include <istream>
 #include <optional>
-#include <unordered_map>
+#include <unordered_set>
 #include <utility>
 
 namespace SampleHost {
@@ -85,6 +88,63 @@ bool SplitWords(std::string_view line, std::vector<std::string>& words, std::str
     }
 }
 
+// The views by name: positions in the description's own list, so that a name is held
+// once. A node-based map would cost more than the view records themselves for a file of
+// short view lines.
+class ViewIndex {
+public:
+    static constexpr std::size_t kNone = static_cast<std::size_t>(-1);
+
+    explicit ViewIndex(const std::vector<ViewDesc>& views) : m_views(views) {}
+
+    std::size_t Find(std::string_view name) const {
+        if (m_slots.empty()) {
+            return kNone;
+        }
+        for (std::size_t slot = Hash(name) & Mask();; slot = (slot + 1) & Mask()) {
+            const std::uint32_t entry = m_slots[slot];
+            if (entry == 0) {
+                return kNone;
+            }
+            if (m_views[entry - 1].name == name) {
+                return entry - 1;
+            }
+        }
+    }
+
+    /// Adds the view at `index`, whose name is not in the index yet.
+    void Add(std::size_t index) {
+        if ((m_count + 1) * 2 > m_slots.size()) {
+            Grow();
+        }
+        Place(index);
+        ++m_count;
+    }
+
+private:
+    static std::size_t Hash(std::string_view name) { return std::hash<std::string_view>{}(name); }
+    std::size_t Mask() const { return m_slots.size() - 1; }
+
+    void Place(std::size_t index) {
+        std::size_t slot = Hash(m_views[index].name) & Mask();
+        while (m_slots[slot] != 0) {
+            slot = (slot + 1) & Mask();
+        }
+        m_slots[slot] = static_cast<std::uint32_t>(index + 1);
+    }
+
+    void Grow() {
+        m_slots.assign(std::max<std::size_t>(16, m_slots.size() * 2), 0);
+        for (std::size_t i = 0; i < m_count; ++i) {
+            Place(i);
+        }
+    }
+
+    const std::vector<ViewDesc>& m_views;
+    std::vector<std::uint32_t> m_slots; // view position + 1; 0 is a free slot
+    std::size_t m_count = 0;
+};
+
 // A reference to a view by name, resolved once every view is known.
 struct PendingName {
     int line;
@@ -105,9 +165,11 @@ struct PendingBinding {
 // names met on the way wait in the pending lists until every view is declared.
 class Reader {
 public:
-    Reader(Description& out, ParseError& error) : m_out(out), m_error(error) {}
+    Reader(Description& out, ParseError& error)
+        : m_out(out), m_error(error), m_viewIndex(out.views) {}
 
-    bool ReadLines(std::string_view text);
+    /// One line, without its line feed.
+    bool ReadLine(std::string_view line);
     bool Resolve();
 
 private:
@@ -146,35 +208,30 @@ private:
     Description& m_out;
     ParseError& m_error;
     int m_line = 0;
-    std::unordered_map<std::string, std::size_t> m_viewIndex;
+    Words m_words; // kept between lines so that their buffers are reused
+    std::string m_why;
+    ViewIndex m_viewIndex;
     std::optional<PendingName> m_defaultView;
+    // What names a view not declared when it was read; the views that have something
+    // waiting take everything of that kind after it in the same way, so that the end keeps
+    // the file's order.
     std::vector<PendingUnit> m_units;
     std::vector<PendingBinding> m_bindings;
+    std::unordered_set<std::string> m_waitingUnits;
+    std::unordered_set<std::string> m_waitingBindings;
     std::optional<PendingName> m_unknown; // the first name that resolved to no view
 };
 
-bool Reader::ReadLines(std::string_view text) {
-    Words words;
-    std::string why;
-    std::size_t pos = 0;
-    while (pos < text.size()) {
-        const std::size_t end = std::min(text.find('\n', pos), text.size());
-        const std::string_view line = text.substr(pos, end - pos);
-        pos = end + 1;
-        ++m_line;
-
-        const std::size_t first = line.find_first_not_of(" \t\r");
-        if (first == std::string_view::npos || line[first] == '#') {
-            continue;
-        }
-        if (!SplitWords(line, words, why)) {
-            return Fail(m_line, why);
-        }
-        if (!Directive(words)) {
-            return false;
-        }
+bool Reader::ReadLine(std::string_view line) {
+    ++m_line;
+    const std::size_t first = line.find_first_not_of(" \t\r");
+    if (first == std::string_view::npos || line[first] == '#') {
+        return true;
     }
-    return true;
+    if (!SplitWords(line, m_words, m_why)) {
+        return Fail(m_line, m_why);
+    }
+    return Directive(m_words);
 }
 
 bool Reader::Directive(const Words& words) {
@@ -203,7 +260,7 @@ bool Reader::View(const Words& words) {
     if (args < 1 || args > 3 || (args == 3 && words[3] != "second")) {
         return Fail(m_line, "view takes a name, an optional type and `second`");
     }
-    if (!m_viewIndex.emplace(words[1], m_out.views.size()).second) {
+    if (m_viewIndex.Find(words[1]) != ViewIndex::kNone) {
         return Fail(m_line, "view '" + words[1] + "' declared twice");
     }
     ViewDesc view;
@@ -212,6 +269,7 @@ bool Reader::View(const Words& words) {
     view.typeId = args >= 2 ? words[2] : std::string();
     view.secondIdentity = args == 3;
     m_out.views.push_back(std::move(view));
+    m_viewIndex.Add(m_out.views.size() - 1);
     return true;
 }
 
@@ -247,6 +305,14 @@ bool Reader::Unit(const Words& words) {
             return Fail(m_line, "unknown unit option '" + words[i] + "'");
         }
     }
+    // A view known by now, with nothing of its own waiting, takes the unit at once: only
+    // what names a view further down waits for the end, in file order.
+    const std::size_t view = m_viewIndex.Find(words[1]);
+    if (view != ViewIndex::kNone && !m_waitingUnits.contains(words[1])) {
+        m_out.views[view].units.push_back(std::move(pending.unit));
+        return true;
+    }
+    m_waitingUnits.insert(words[1]);
     m_units.push_back(std::move(pending));
     return true;
 }
@@ -259,6 +325,23 @@ bool Reader::Binding(const Words& words) {
     for (std::size_t i = 2; i < words.size(); ++i) {
         pending.produced.push_back({m_line, words[i]});
     }
+    const std::size_t view = m_viewIndex.Find(words[1]);
+    if (view != ViewIndex::kNone && !m_waitingBindings.contains(words[1])) {
+        std::vector<std::size_t> produced;
+        produced.reserve(pending.produced.size());
+        for (const PendingName& name : pending.produced) {
+            const std::size_t index = m_viewIndex.Find(name.name);
+            if (index == ViewIndex::kNone) {
+                break;
+            }
+            produced.push_back(index);
+        }
+        if (produced.size() == pending.produced.size()) {
+            m_out.views[view].bindings.push_back(std::move(produced));
+            return true;
+        }
+    }
+    m_waitingBindings.insert(words[1]);
     m_bindings.push_back(std::move(pending));
     return true;
 }
@@ -284,9 +367,9 @@ bool Reader::FailStep(const Words& words) {
 }
 
 std::size_t Reader::ResolveName(const PendingName& name) {
-    const auto found = m_viewIndex.find(name.name);
-    if (found != m_viewIndex.end()) {
-        return found->second;
+    const std::size_t found = m_viewIndex.Find(name.name);
+    if (found != ViewIndex::kNone) {
+        return found;
     }
     if (!m_unknown || name.line < m_unknown->line) {
         m_unknown = name;
@@ -332,7 +415,27 @@ bool Reader::Resolve() {
 bool ParseDescription(std::string_view text, Description& out, ParseError& error) {
     out = Description{};
     Reader reader(out, error);
-    return reader.ReadLines(text) && reader.Resolve();
+    std::size_t pos = 0;
+    while (pos < text.size()) {
+        const std::size_t end = std::min(text.find('\n', pos), text.size());
+        if (!reader.ReadLine(text.substr(pos, end - pos))) {
+            return false;
+        }
+        pos = end + 1;
+    }
+    return reader.Resolve();
+}
+
+bool ParseDescription(std::istream& in, Description& out, ParseError& error) {
+    out = Description{};
+    Reader reader(out, error);
+    std::string line;
+    while (std::getline(in, line)) {
+        if (!reader.ReadLine(line)) {
+            return false;
+        }
+    }
+    return reader.Resolve();
 }
 
 } // namespace SampleHost

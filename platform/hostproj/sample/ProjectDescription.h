@@ -9,6 +9,7 @@
 #pragma once
 
 #include <cstddef>
+#include <iosfwd>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -76,5 +77,9 @@ struct ParseError {
 /// Reads a whole description. On failure returns false, fills error with the first
 /// offending line and what is wrong there, and leaves out in an unspecified state.
 bool ParseDescription(std::string_view text, Description& out, ParseError& error);
+
+/// The same, line by line from `in`, so that the text is never held whole. Stops at the
+/// first offending line; the caller tells a failed read from the end of the text.
+bool ParseDescription(std::istream& in, Description& out, ParseError& error);
 
 } // namespace SampleHost

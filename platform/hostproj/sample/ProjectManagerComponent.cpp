@@ -17,6 +17,7 @@
 #include "hostproj/Dpm.h"
 
 #include <memory>
+#include <mutex>
 #include <string>
 #include <vector>
 
@@ -45,7 +46,9 @@ public:
     CitI::IInterface* GetInterface(const Port::XUID& id) override { return Ask(id); }
     const Description& Desc() const { return *m_description; }
     Counting CountingMode() const { return CountingOf(*m_description); }
-    View* ViewAt(std::size_t index) const { return m_views[index].get(); }
+    View* ViewAt(std::size_t index) const;
+    /// Guards the parts made on first request, should two threads walk one network.
+    std::mutex& PartsMutex() const { return m_partsMutex; }
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override {
@@ -54,7 +57,10 @@ protected:
 
 private:
     std::shared_ptr<const Description> m_description;
-    std::vector<std::unique_ptr<View>> m_views;
+    // Made when first asked for: a lookup meets a few views of a network that may have
+    // a million, and a part costs several times the line that describes it.
+    mutable std::vector<std::unique_ptr<View>> m_views;
+    mutable std::mutex m_partsMutex;
 };
 
 class ViewType final : public HostObject,
@@ -202,14 +208,8 @@ private:
 class View final : public HostObject, public Dpm::IView {
 public:
     View(Network& network, const ViewDesc& desc)
-        : HostObject(g_alive, network.CountingMode(), &network), m_network(network), m_desc(desc) {
-        for (const UnitDesc& unit : desc.units) {
-            m_units.push_back(std::make_unique<Unit>(network, unit));
-        }
-        for (const auto& produced : desc.bindings) {
-            m_bindings.push_back(std::make_unique<Binding>(network, produced));
-        }
-    }
+        : HostObject(g_alive, network.CountingMode(), &network), m_network(network), m_desc(desc),
+          m_units(desc.units.size()), m_bindings(desc.bindings.size()) {}
 
     CitI::IInterface* GetInterface(const Port::XUID& id) override { return Ask(id); }
     std::int64_t GetViewType(Dpm::IViewType*& type) override {
@@ -220,9 +220,21 @@ public:
 
     Network& Owner() const { return m_network; }
     std::size_t NumUnits() const { return m_units.size(); }
-    Unit* UnitAt(std::size_t i) const { return m_units[i].get(); }
+    Unit* UnitAt(std::size_t i) const {
+        std::lock_guard lock(m_network.PartsMutex());
+        if (!m_units[i]) {
+            m_units[i] = std::make_unique<Unit>(m_network, m_desc.units[i]);
+        }
+        return m_units[i].get();
+    }
     std::size_t NumBindings() const { return m_bindings.size(); }
-    Binding* BindingAt(std::size_t i) const { return m_bindings[i].get(); }
+    Binding* BindingAt(std::size_t i) const {
+        std::lock_guard lock(m_network.PartsMutex());
+        if (!m_bindings[i]) {
+            m_bindings[i] = std::make_unique<Binding>(m_network, m_desc.bindings[i]);
+        }
+        return m_bindings[i].get();
+    }
 
 protected:
     CitI::IInterface* Own(const Port::XUID& id) override { return OwnOnly<Dpm::IView>(this, id); }
@@ -230,15 +242,22 @@ protected:
 private:
     Network& m_network;
     const ViewDesc& m_desc;
-    std::vector<std::unique_ptr<Unit>> m_units;
-    std::vector<std::unique_ptr<Binding>> m_bindings;
+    // Made on first request, as the network's views are.
+    mutable std::vector<std::unique_ptr<Unit>> m_units;
+    mutable std::vector<std::unique_ptr<Binding>> m_bindings;
 };
 
 Network::Network(std::shared_ptr<const Description> description)
-    : HostObject(g_alive, CountingOf(*description)), m_description(std::move(description)) {
-    for (const ViewDesc& view : m_description->views) {
-        m_views.push_back(std::make_unique<View>(*this, view));
+    : HostObject(g_alive, CountingOf(*description)), m_description(std::move(description)),
+      m_views(m_description->views.size()) {}
+
+View* Network::ViewAt(std::size_t index) const {
+    std::lock_guard lock(m_partsMutex);
+    if (!m_views[index]) {
+        m_views[index] =
+            std::make_unique<View>(const_cast<Network&>(*this), m_description->views[index]);
     }
+    return m_views[index].get();
 }
 
 Network::~Network() = default;

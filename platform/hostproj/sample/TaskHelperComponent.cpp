@@ -18,6 +18,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <limits>
 #include <memory>
 #include <string>
 
@@ -165,11 +166,8 @@ std::shared_ptr<const Description> ReadDescription() {
     if (path == nullptr || *path == '\0') {
         return description;
     }
-    std::string text;
     std::string why;
-    // A FIFO or a device named by mistake is refused rather than waited on or read
-    // without end.
-    if (!Port::ReadRegularFile(path, text, why)) {
+    auto cannotRead = [&] {
         const std::string prefix = std::string(path) + ": ";
         if (why.rfind(prefix, 0) == 0) {
             why.erase(0, prefix.size());
@@ -177,9 +175,24 @@ std::shared_ptr<const Description> ReadDescription() {
         Report(__LINE__).issueError("project description %s cannot be read: %s\n", path,
                                     why.c_str());
         return std::make_shared<Description>();
+    };
+    // A FIFO or a device named by mistake is refused rather than waited on or read
+    // without end.
+    Port::InputFile file;
+    if (!file.Open(path, why)) {
+        return cannotRead();
     }
+    // Read line by line: the text is never held whole beside what is made of it.
     ParseError error;
-    if (!ParseDescription(text, *description, error)) {
+    const bool parsed = ParseDescription(file.Stream(), *description, error);
+    if (!parsed) {
+        // A file that cannot be read to its end is reported as such, whatever its lines.
+        file.Stream().ignore(std::numeric_limits<std::streamsize>::max());
+    }
+    if (file.Failed(why)) {
+        return cannotRead();
+    }
+    if (!parsed) {
         Report(__LINE__).issueError("project description %s, line %d: %s\n", path, error.line,
                                     error.what.c_str());
         return std::make_shared<Description>();
