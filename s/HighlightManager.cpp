@@ -115,6 +115,7 @@ std::int64_t HighlightManager::AddHighlightedItem(VnI::IDeviceResource* resource
     if (resource == nullptr) {
         return 1;
     }
+    m_imp->m_index.Prefetch(resource);
     // The list node is made in a list of its own and spliced in (which cannot fail) once
     // the index holds it, and the flag is set last: a failed allocation leaves list,
     // index and flag as they were.

@@ -157,6 +157,7 @@ bool Record::Select(VnI::IPropertyHolder* holder) {
     if (holder == nullptr) {
         return false;
     }
+    m_index.Prefetch(holder);
     const int type = holder->GetType();
     if (type < 0) {
         Port_MsgManData::debugStub("Cannot select an item of negative type %d\n", type);

@@ -11,8 +11,13 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
+#include <filesystem>
+#include <fstream>
 #include <map>
 #include <random>
+#include <sstream>
+#include <string>
 #include <vector>
 
 namespace {
@@ -211,4 +216,50 @@ TEST(PointerIndex, RandomChurnAroundTheWrapKeepsEveryKeyReachable) {
         }
         EXPECT_TRUE(model.empty());
     }
+}
+
+namespace {
+
+// The VmFlags line of the mapping that holds address, as the kernel reports it; empty
+// when there is none.
+std::string VmFlagsOf(const void* address) {
+    const auto at = reinterpret_cast<std::uintptr_t>(address);
+    std::ifstream smaps("/proc/self/smaps");
+    std::string line;
+    bool inside = false;
+    while (std::getline(smaps, line)) {
+        std::uintptr_t low = 0;
+        std::uintptr_t high = 0;
+        char dash = 0;
+        std::istringstream range(line);
+        if (range >> std::hex >> low >> dash >> high && dash == '-' &&
+            line.find(':') > line.find(' ')) {
+            inside = low <= at && at < high;
+        } else if (inside && line.rfind("VmFlags:", 0) == 0) {
+            return line;
+        }
+    }
+    return {};
+}
+
+} // namespace
+
+// A table of many megabytes is probed at random: it asks for huge pages before its first
+// touch, and still starts with every slot empty.
+TEST(PointerIndexTable, LargeTableIsAdvisedForHugePagesAndStartsEmpty) {
+    using Slot = Vn::Eng::detail::KeyedSlot<int, int>;
+    constexpr std::size_t kSlots = std::size_t{1} << 20; // 16 MiB
+    Vn::Eng::detail::SlotTable<Slot> table(kSlots);
+    ASSERT_EQ(table.size(), kSlots);
+    EXPECT_TRUE(std::all_of(table.begin(), table.end(), [](const Slot& s) { return s.Empty(); }));
+
+    if (!std::filesystem::exists("/sys/kernel/mm/transparent_hugepage/enabled")) {
+        GTEST_SKIP() << "this kernel has no transparent huge pages";
+    }
+    constexpr std::uintptr_t kHuge = std::uintptr_t{1} << 21;
+    const auto first = reinterpret_cast<std::uintptr_t>(table.data());
+    const void* interior = reinterpret_cast<const void*>((first + kHuge - 1) & ~(kHuge - 1));
+    const std::string flags = VmFlagsOf(interior);
+    ASSERT_FALSE(flags.empty()) << "no mapping found for the table in /proc/self/smaps";
+    EXPECT_NE((flags + " ").find(" hg "), std::string::npos) << flags;
 }
