@@ -30,6 +30,11 @@ struct Group {
     std::vector<std::pair<std::string, Swatch>> colors;
 };
 
+// A group takes its title's row and one row per 24 swatches.
+std::size_t RowsOf(std::size_t swatches) {
+    return 1 + (swatches + 23) / 24;
+}
+
 std::string Hex(const Swatch& color) {
     if (!color.present) {
         return "(none)";
@@ -78,10 +83,11 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
     for (const auto& group : groups) {
         widest = std::max(widest, group.colors.size());
     }
-    double width = left * 2 + labelWidth + std::min<std::size_t>(widest, 24) * (swatch + 4);
+    double width = left * 2 + labelWidth +
+                   static_cast<double>(std::min<std::size_t>(widest, 24)) * (swatch + 4);
     double height = 60;
     for (const auto& group : groups) {
-        height += (1 + (group.colors.size() + 23) / 24) * (swatch + 8);
+        height += static_cast<double>(RowsOf(group.colors.size())) * (swatch + 8);
     }
     SvgWriter svg(width, height);
     svg.Text(left, 26, "Colour scheme: " + source, 14);
@@ -107,7 +113,7 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
             }
             ++i;
         }
-        y += (1 + (group.colors.size() + 23) / 24) * (swatch + 8);
+        y += static_cast<double>(RowsOf(group.colors.size())) * (swatch + 8);
         if (group.colors.empty()) {
             y -= swatch + 8;
         }

@@ -218,6 +218,7 @@ SearchAndPrint(const SearchRequest& request, const Ptr<VnI::IProperty>& wanted,
                 continue;
             }
             std::vector<std::string> row;
+            row.reserve(columns.size());
             for (const auto& column : columns) {
                 row.push_back(ValueText(match->GetPropertyByName(column.c_str())));
             }
