@@ -100,8 +100,10 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
         svg.Text(left, y + 15, title, 12);
         std::size_t i = 0;
         for (const auto& [name, color] : group.colors) {
-            double x = left + labelWidth + static_cast<double>(i % 24) * (swatch + 4);
-            double row = y + static_cast<double>(i / 24) * (swatch + 8);
+            const std::size_t column = i % 24;
+            const std::size_t line = i / 24; // whole rows of 24 swatches
+            double x = left + labelWidth + static_cast<double>(column) * (swatch + 4);
+            double row = y + static_cast<double>(line) * (swatch + 8);
             // A missing colour is drawn crossed out rather than left out, so that the
             // swatches still count what the scheme lacks.
             if (color.present) {
