@@ -26,6 +26,7 @@ namespace VnBench {
 
 std::vector<std::string> SixteenNames() {
     std::vector<std::string> names;
+    names.reserve(16);
     for (int i = 0; i < 16; ++i) {
         names.push_back(std::string("Prop").append(std::to_string(i)));
     }

@@ -319,7 +319,7 @@ void Tree(benchmark::State& state, size_t count, bool chain) {
 
 void RegisterHolderBenchmarks() {
     const Sizes& sizes = GetSizes();
-    const int repeat = sizes.tiny ? 1 : 3;
+    const benchmark::IterationCount repeat = sizes.tiny ? 1 : 3;
     PerCall(benchmark::RegisterBenchmark("lookup/ours", Lookup));
     PerCall(benchmark::RegisterBenchmark("reference/counted_copy", CountedCopy));
     PerCall(benchmark::RegisterBenchmark("reference/position_only", LookupPositionOnly));

@@ -211,7 +211,7 @@ void TileSiteColour(benchmark::State& state) {
 
 void RegisterLibraryBenchmarks() {
     const Sizes& sizes = GetSizes();
-    const int repeat = sizes.tiny ? 1 : 3;
+    const benchmark::IterationCount repeat = sizes.tiny ? 1 : 3;
     benchmark::RegisterBenchmark("selection/ours_small", SelectThenRemove, sizes.small)
         ->Iterations(repeat * 10);
     benchmark::RegisterBenchmark("selection/ours_large", SelectThenRemove, sizes.large)

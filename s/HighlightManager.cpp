@@ -47,7 +47,12 @@ public:
 
     bool Empty() const { return m_bits == 0; }
     bool Boxed() const { return (m_bits & 1) != 0; }
-    Entries* Box() const { return reinterpret_cast<Entries*>(m_bits & ~std::uint64_t{1}); }
+    // The slot is one word: a boxed entry is its pointer with the low bit set, so it must be
+    // rebuilt from the integer.
+    Entries* Box() const {
+        return reinterpret_cast<Entries*>( // NOLINT(performance-no-int-to-ptr)
+            m_bits & ~std::uint64_t{1});
+    }
     List::iterator Only() const { return Bits::From(m_bits); }
     const VnI::IDeviceResource* KeyOf() const { return Boxed() ? Box()->GetKey() : *Only(); }
     bool Holds(const VnI::IDeviceResource* key, std::uint64_t hash) const {

@@ -69,7 +69,12 @@ public:
 
     bool Empty() const { return m_all == 0; }
     bool Boxed() const { return (m_all & 1) != 0; }
-    Positions* Box() const { return reinterpret_cast<Positions*>(m_all & ~std::uint64_t{1}); }
+    // The first word doubles as the boxed positions' pointer with the low bit set, so it
+    // must be rebuilt from the integer.
+    Positions* Box() const {
+        return reinterpret_cast<Positions*>( // NOLINT(performance-no-int-to-ptr)
+            m_all & ~std::uint64_t{1});
+    }
     Entry Only() const {
         const auto category = static_cast<int>((m_all >> 48) | ((m_inCategory >> 48) & 0xF) << 16);
         return Entry{category, Bits::From(m_inCategory), Bits::From(m_all), true, true};

@@ -95,6 +95,7 @@ TEST(ComponentFactory, ConcurrentLoadsOfOneNameWaitForItsInit) {
     std::atomic<int> loaded{0};
     std::atomic<int> created{0};
     std::vector<std::thread> threads;
+    threads.reserve(kThreads);
     for (int i = 0; i < kThreads; ++i) {
         threads.emplace_back([&] {
             ++ready;

@@ -60,6 +60,7 @@ TEST(RefCounting, ConcurrentAddRefReleasePairsLeaveTheCountAndDestroyOnce) {
     int destroyed = 0;
     auto* probe = new Probe(&destroyed);
     std::vector<std::thread> threads;
+    threads.reserve(8);
     for (int t = 0; t < 8; ++t) {
         threads.emplace_back([probe] {
             for (int i = 0; i < 100000; ++i) {
@@ -87,11 +88,12 @@ TEST(RefCounting, CountedPointerAddsOnCopyAndDropsOnReset) {
         CommonI::RefCountPtr<CitI::IInterface> fromRaw(adopted.Get());
         EXPECT_EQ(CountOf(adopted.Get()), 3);
         CommonI::RefCountPtr<CitI::IInterface> moved = std::move(copy);
-        EXPECT_FALSE(copy);
+        EXPECT_FALSE(copy); // NOLINT(bugprone-use-after-move): a moved-from pointer is empty
         EXPECT_EQ(CountOf(adopted.Get()), 3);
     }
     EXPECT_EQ(CountOf(adopted.Get()), 1);
-    adopted = adopted; // self-assignment keeps the reference
+    auto& same = adopted; // through an alias, as self-assignment happens in real code
+    adopted = same;       // self-assignment keeps the reference
     EXPECT_EQ(CountOf(adopted.Get()), 1);
     adopted.Reset();
     EXPECT_FALSE(adopted);
@@ -121,6 +123,7 @@ TEST(RefCounting, TheRecordCounterDestroysItsOwnerOnceOnTheLastReleaseFromAnyThr
         counter->AddRef();
     }
     std::vector<std::thread> threads;
+    threads.reserve(8);
     for (int t = 0; t < 8; ++t) {
         threads.emplace_back([counter] { counter->Release(); });
     }

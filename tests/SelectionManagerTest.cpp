@@ -357,6 +357,7 @@ TEST(SelectionManager, WideCategoriesAndReselectionsLeaveExactlyTheirOwnPlaces) 
     const int kTypes[] = {
         0, 11, (1 << 16) - 1, 1 << 16, (1 << 16) + 5, SelectionManager::kMaxCategories - 1};
     std::vector<std::unique_ptr<FakeHolder>> holders;
+    holders.reserve(600);
     for (int i = 0; i < 600; ++i) {
         holders.push_back(std::make_unique<FakeHolder>(kTypes[i % 6]));
     }

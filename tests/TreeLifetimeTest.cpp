@@ -209,6 +209,7 @@ TEST(TreeBackLinks, ANodeForgetsItsDestroyedHolder) {
 
 TEST(TreeBackLinks, CopiesAndOriginalsAreSafeToWalkAfterTheHoldersGo) {
     std::vector<std::unique_ptr<Holder>> holders;
+    holders.reserve(5);
     for (int i = 0; i < 5; ++i) {
         holders.push_back(std::make_unique<Holder>(std::to_string(i)));
     }

@@ -30,6 +30,11 @@ struct Group {
     std::vector<std::pair<std::string, Swatch>> colors;
 };
 
+// A group takes its title's row and one row per 24 swatches.
+std::size_t RowsOf(std::size_t swatches) {
+    return 1 + (swatches + 23) / 24;
+}
+
 std::string Hex(const Swatch& color) {
     if (!color.present) {
         return "(none)";
@@ -78,10 +83,11 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
     for (const auto& group : groups) {
         widest = std::max(widest, group.colors.size());
     }
-    double width = left * 2 + labelWidth + std::min<std::size_t>(widest, 24) * (swatch + 4);
+    double width = left * 2 + labelWidth +
+                   static_cast<double>(std::min<std::size_t>(widest, 24)) * (swatch + 4);
     double height = 60;
     for (const auto& group : groups) {
-        height += (1 + (group.colors.size() + 23) / 24) * (swatch + 8);
+        height += static_cast<double>(RowsOf(group.colors.size())) * (swatch + 8);
     }
     SvgWriter svg(width, height);
     svg.Text(left, 26, "Colour scheme: " + source, 14);
@@ -94,8 +100,10 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
         svg.Text(left, y + 15, title, 12);
         std::size_t i = 0;
         for (const auto& [name, color] : group.colors) {
-            double x = left + labelWidth + static_cast<double>(i % 24) * (swatch + 4);
-            double row = y + static_cast<double>(i / 24) * (swatch + 8);
+            const std::size_t column = i % 24;
+            const std::size_t line = i / 24; // whole rows of 24 swatches
+            double x = left + labelWidth + static_cast<double>(column) * (swatch + 4);
+            double row = y + static_cast<double>(line) * (swatch + 8);
             // A missing colour is drawn crossed out rather than left out, so that the
             // swatches still count what the scheme lacks.
             if (color.present) {
@@ -107,7 +115,7 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
             }
             ++i;
         }
-        y += (1 + (group.colors.size() + 23) / 24) * (swatch + 8);
+        y += static_cast<double>(RowsOf(group.colors.size())) * (swatch + 8);
         if (group.colors.empty()) {
             y -= swatch + 8;
         }

@@ -53,6 +53,7 @@ int CountChildren(const Ptr<VnI::ITreeNode>& node) {
 
 std::vector<std::string> ColumnNames(VnI::IPropertyNameList* names) {
     std::vector<std::string> columns;
+    columns.reserve(static_cast<std::size_t>(std::max(0, names->GetNumNames())));
     for (int i = 0; i < names->GetNumNames(); ++i) {
         columns.push_back(names->GetPropertyName(i)->GetName().str());
     }
@@ -218,6 +219,7 @@ SearchAndPrint(const SearchRequest& request, const Ptr<VnI::IProperty>& wanted,
                 continue;
             }
             std::vector<std::string> row;
+            row.reserve(columns.size());
             for (const auto& column : columns) {
                 row.push_back(ValueText(match->GetPropertyByName(column.c_str())));
             }

@@ -25,6 +25,7 @@
 #include <array>
 #include <atomic>
 #include <chrono>
+#include <cmath>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -64,7 +65,8 @@ double Percentile(std::vector<double> values, double p) {
         return 0;
     }
     std::sort(values.begin(), values.end());
-    std::size_t at = static_cast<std::size_t>(p * static_cast<double>(values.size() - 1) + 0.5);
+    std::size_t at =
+        static_cast<std::size_t>(std::lround(p * static_cast<double>(values.size() - 1)));
     return values[std::min(at, values.size() - 1)];
 }
 
@@ -201,6 +203,7 @@ int main(int argc, char** argv) {
     std::atomic<long> failures{0};
     std::vector<std::vector<double>> latencies(static_cast<std::size_t>(clients));
     std::vector<std::thread> threads;
+    threads.reserve(static_cast<std::size_t>(clients));
     for (int c = 0; c < clients; ++c) {
         threads.emplace_back([&, c] {
             httplib::Client client("127.0.0.1", server.Port());

@@ -309,6 +309,7 @@ TEST(AllocationFailure, SelectingASubtreeIsTakenBackWhole) {
 TEST(AllocationFailure, HighlightingLeavesListIndexAndFlagsAsTheyWere) {
     std::vector<FakeResource> pool(40);
     std::vector<FakeResource*> all;
+    all.reserve(pool.size());
     for (FakeResource& r : pool) {
         all.push_back(&r);
     }

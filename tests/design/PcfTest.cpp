@@ -20,8 +20,8 @@ const char kUserFile[] = "# board: icestick\r\n"
                          "set_io led[1] 2";
 
 TEST(Pcf, AnUnchangedFileIsWrittenBackByteForByte) {
-    for (std::string text : {std::string(kUserFile), std::string(""), std::string("\n\n"),
-                             std::string("set_io a 1\n")}) {
+    for (const std::string& text : {std::string(kUserFile), std::string(""), std::string("\n\n"),
+                                    std::string("set_io a 1\n")}) {
         PcfFile pcf;
         std::string error;
         ASSERT_TRUE(pcf.Parse(text, "p.pcf", error)) << error;

@@ -114,6 +114,7 @@ TEST(PinChecks, EachMistakeIsReportedAtItsLine) {
             "p.pcf:5: error: pin 1 already holds port 'led[0]' (line 4)",
             "p.pcf:7: error: port 'led[2]' is put on two pins: 2 (line 6) and 3",
             "p.pcf:8: error: duplicate constraint: port 'led[0]' is already on pin 1 (line 4)",
+            // NOLINTNEXTLINE(bugprone-suspicious-missing-comma): one message, split to fit
             "p.pcf:9: error: design top.json has no port 'ghost' (add -nowarn to keep the line "
             "anyway)",
             "p.pcf:12: error: nextpnr-ice40 knows no PCF command 'set_foo'",

@@ -191,7 +191,7 @@ INSTANTIATE_TEST_SUITE_P(
 
 TEST_F(KeyFile, RejectsANulByteInALine) {
     VnTest::MessageCapture capture;
-    Reader r(Write(std::string_view("A = 1\nB = 2\0\n", 14)));
+    Reader r(Write(std::string_view("A = 1\nB = 2\0\n", 13)));
     EXPECT_EQ(r.keys.get_validity(), 0);
     ASSERT_EQ(capture.Errors().size(), 1u);
     EXPECT_NE(capture.Errors()[0].find("line 2:"), std::string::npos);

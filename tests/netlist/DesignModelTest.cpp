@@ -460,7 +460,7 @@ TEST_F(NetlistFiles, ValuesOfAnotherTypeThanTheColumnsAreRefused) {
     // Written as another program would, without STRICT tables: every column takes any
     // type of value, and the reader must look at each.
     const auto outside = [this](const std::string& name, const std::string& changes) {
-        const std::string path = PathOf(name);
+        std::string path = PathOf(name);
         ExecSql(path, VnTest::kOutsideSchema);
         ExecSql(path, ("INSERT INTO nmod_format VALUES (1, 'NGD', " +
                        std::to_string(Nmod_Model::kFormatVersion) +

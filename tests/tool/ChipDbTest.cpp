@@ -31,7 +31,7 @@ IndependentCounts CountByScan(const std::string& path) {
     std::string line;
     std::string pinsOf;
     while (std::getline(in, line)) {
-        if (line.rfind(".", 0) == 0) {
+        if (line.rfind('.', 0) == 0) {
             pinsOf.clear();
             std::istringstream fields(line);
             std::string head, arg;

@@ -157,7 +157,7 @@ Scan ScanChipDb(const std::string& path, const std::string& package) {
         std::istringstream fields(line);
         std::string head;
         fields >> head;
-        if (head.rfind(".", 0) == 0) {
+        if (head.rfind('.', 0) == 0) {
             inPins = false;
             if (head == ".device") {
                 std::string name;

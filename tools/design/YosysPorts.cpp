@@ -128,7 +128,7 @@ const char* ClockConnection(const std::string& type) {
     if (type.rfind("$_", 0) == 0 && type.find("DFF") != std::string::npos) {
         return "C"; // yosys gate-level flip-flops: $_DFF_P_, $_SDFFE_PP0P_, ...
     }
-    if (type.rfind("$", 0) == 0 && type.find("dff") != std::string::npos) {
+    if (type.rfind('$', 0) == 0 && type.find("dff") != std::string::npos) {
         return "CLK"; // yosys word-level flip-flops: $dff, $adff, $sdffe, ...
     }
     if (type == "SB_GB") {

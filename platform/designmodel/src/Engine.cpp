@@ -116,8 +116,10 @@ void RefuseUnfinishedChanges(const std::string& fileName) {
         struct stat info {};
         const std::string beside = fileName + suffix;
         if (::stat(beside.c_str(), &info) == 0 && info.st_size > 0) {
-            throw Nmod_Exception::Format("netlist database \"" + fileName + "\" has changes in \"" +
-                                         beside + "\" that were never written into it");
+            std::string message = "netlist database \"";
+            message.append(fileName).append("\" has changes in \"").append(beside);
+            message.append("\" that were never written into it");
+            throw Nmod_Exception::Format(std::move(message));
         }
     }
 }

@@ -96,7 +96,7 @@ struct Value {
 };
 
 short ClampShort(std::size_t n) {
-    return n > SHRT_MAX ? SHRT_MAX : static_cast<short>(n);
+    return static_cast<short>(std::min<std::size_t>(n, SHRT_MAX));
 }
 
 // A position in one line of a key file.

@@ -40,7 +40,7 @@ std::vector<std::string> Candidates(const std::string& name) {
     std::vector<std::string> paths;
     for (const std::string& dir : SearchDirectories()) {
         for (const std::string& file : {"lib" + name + ".so", name + ".so", name}) {
-            paths.push_back(dir + "/" + file);
+            paths.push_back((dir + "/").append(file));
         }
     }
     return paths;
@@ -77,7 +77,7 @@ std::string OpenAndInit(const std::string& key) {
 } // namespace
 
 bool Factory::LoadLibraryFactory(const Port::StringBase<char>& name) {
-    const std::string key = name.str();
+    const std::string& key = name.str();
     if (key.empty() || key.find('\0') != std::string::npos) {
         return false;
     }

@@ -21,9 +21,9 @@ namespace {
 // The most one compiled expression may grow to (its programs and the state caches its
 // automata fill while matching); the cache charges every entry this much, so the bound
 // holds however the entries are used later.
-constexpr std::int64_t kMaxMemPerExpression = 512 * 1024;
+constexpr std::int64_t kMaxMemPerExpression = std::int64_t{512} * 1024;
 // What the shared cache may hold in all.
-constexpr std::size_t kCacheBudget = 8 * 1024 * 1024;
+constexpr std::size_t kCacheBudget = std::size_t{8} * 1024 * 1024;
 
 RE2::Options QuietOptions() {
     RE2::Options options;

@@ -27,7 +27,7 @@ constexpr std::size_t kHexDigits = 8;
 // folder, so a leftover must also have been left alone this long before it is removed;
 // after a day it goes whatever its pid says (the pid may have been reused).
 constexpr std::time_t kLeftoverQuiet = 60;
-constexpr std::time_t kLeftoverStale = 24 * 60 * 60;
+constexpr std::time_t kLeftoverStale = std::time_t{24} * 60 * 60;
 
 std::string Reason(int error) {
     return std::strerror(error);
@@ -593,7 +593,9 @@ std::string Printable(std::string_view text) {
     };
     for (std::size_t i = 0; i < text.size(); ++i) {
         const auto c = static_cast<unsigned char>(text[i]);
-        if (c < 0x20 || c == 0x7f) {
+        if (c < 0x20 || c == 0x7f || (c >= 0x80 && c <= 0x9f)) {
+            // C0 controls and DEL; a byte 0x80..0x9f outside UTF-8 is one a terminal in
+            // 8-bit mode would take for a control.
             escape(c);
         } else if (c == 0xc2 && i + 1 < text.size() &&
                    static_cast<unsigned char>(text[i + 1]) >= 0x80 &&
@@ -601,8 +603,6 @@ std::string Printable(std::string_view text) {
             // U+0080..U+009F: the 8-bit control characters, which some terminals obey.
             escape(c);
             escape(static_cast<unsigned char>(text[++i]));
-        } else if (c >= 0x80 && c <= 0x9f) {
-            escape(c); // a stray byte a terminal in 8-bit mode would take for a control
         } else {
             out += static_cast<char>(c);
         }
