@@ -28,6 +28,22 @@ GenericPropertyHolder::~GenericPropertyHolder() {
     delete m_imp;
 }
 
+std::int64_t
+GenericPropertyHolder::AddProperty(const Port::StringBase<char>& name,
+                                   const CommonI::RefCountPtr<VnI::IProperty>& property,
+                                   bool visible) {
+    // A class derived from this one may answer a list of another kind.
+    if (!property || GetPropertyNames() != m_imp->m_propertyNameList) {
+        return PropertyHolder::AddProperty(name, property, visible);
+    }
+    const int index =
+        detail::PositionAddingName(m_imp->m_list, name, *property, visible, detail::kMaxSlot);
+    if (index < 0 || index > detail::kMaxSlot) {
+        return 0;
+    }
+    return detail::StoreProperty(*this, index, m_imp->m_list.GetNumNames(), property);
+}
+
 Port::StringBase<char> GenericPropertyHolder::GetName() {
     return {};
 }

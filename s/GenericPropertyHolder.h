@@ -33,6 +33,13 @@ public:
     GenericPropertyHolder(const GenericPropertyHolder&) = delete;
     GenericPropertyHolder& operator=(const GenericPropertyHolder&) = delete;
 
+    using PropertyHolder::AddProperty;
+    /// As PropertyHolder::AddProperty; on this holder's own list the name is found, or
+    /// added, with one look-up.
+    std::int64_t AddProperty(const Port::StringBase<char>& name,
+                             const CommonI::RefCountPtr<VnI::IProperty>& property,
+                             bool visible) override;
+
     /// Empty: a generic holder has no name of its own.
     Port::StringBase<char> GetName() override;
     /// This holder's own list, borrowed.

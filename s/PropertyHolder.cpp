@@ -17,8 +17,6 @@ namespace {
 const char kRevision[] = "$Revision: 1.6 $";
 const detail::Unit kUnit{"../s/PropertyHolder", kRevision};
 
-// Slot numbers travel as a property's 8-bit index.
-constexpr int kMaxSlot = INT8_MAX;
 constexpr std::size_t kMinCapacity = 16;
 } // namespace
 
@@ -37,6 +35,33 @@ struct Record {
 
 TreeNode*& detail::NodesShowing(PropertyHolder& holder) {
     return holder.m_imp->m_nodesShowing;
+}
+
+std::int64_t detail::StoreProperty(PropertyHolder& holder, int index, int names,
+                                   const CommonI::RefCountPtr<VnI::IProperty>& property) {
+    auto& slots = holder.m_imp->m_properties;
+    const auto numNames = static_cast<std::size_t>(std::max(names, index + 1));
+    if (numNames > slots.capacity()) {
+        slots.reserve(std::max(2 * numNames, kMinCapacity));
+    }
+    if (numNames > slots.size()) {
+        slots.resize(numNames);
+    }
+
+    auto& slot = slots[static_cast<std::size_t>(index)];
+    if (slot == property) {
+        // The same object again: releasing it first could destroy it under our hands.
+        slot->SetIndex(static_cast<std::int8_t>(index));
+        return 1;
+    }
+    if (slot) {
+        slot->SetIndex(-1);
+    } else {
+        ++holder.m_imp->m_numProperties;
+    }
+    slot = property;
+    slot->SetIndex(static_cast<std::int8_t>(index));
+    return 1;
 }
 
 PropertyHolder::PropertyHolder() : m_imp(new PropertyHolderImp::Record()) {}
@@ -91,7 +116,7 @@ std::int64_t PropertyHolder::AddProperty(const Port::StringBase<char>& name,
     if (index < 0) {
         // Refuse before touching the list: a name that could never hold a property
         // would only lengthen every holder's slots for nothing.
-        if (names->GetNumNames() > kMaxSlot) {
+        if (names->GetNumNames() > detail::kMaxSlot) {
             return 0;
         }
         const VnI::PropertyType type = property->GetType();
@@ -101,33 +126,11 @@ std::int64_t PropertyHolder::AddProperty(const Port::StringBase<char>& name,
             index = names->AddName(name, type, visible);
         }
     }
-    if (index < 0 || index > kMaxSlot) {
+    if (index < 0 || index > detail::kMaxSlot) {
         return 0;
     }
 
-    auto& slots = m_imp->m_properties;
-    const auto numNames = static_cast<std::size_t>(std::max(names->GetNumNames(), index + 1));
-    if (numNames > slots.capacity()) {
-        slots.reserve(std::max(2 * numNames, kMinCapacity));
-    }
-    if (numNames > slots.size()) {
-        slots.resize(numNames);
-    }
-
-    auto& slot = slots[static_cast<std::size_t>(index)];
-    if (slot == property) {
-        // The same object again: releasing it first could destroy it under our hands.
-        slot->SetIndex(static_cast<std::int8_t>(index));
-        return 1;
-    }
-    if (slot) {
-        slot->SetIndex(-1);
-    } else {
-        ++m_imp->m_numProperties;
-    }
-    slot = property;
-    slot->SetIndex(static_cast<std::int8_t>(index));
-    return 1;
+    return detail::StoreProperty(*this, index, std::max(names->GetNumNames(), index + 1), property);
 }
 
 std::int64_t PropertyHolder::AddProperty(const Port::StringBase<char>& name,

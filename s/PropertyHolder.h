@@ -37,6 +37,12 @@ struct Record;
 namespace detail {
 // Where the nodes that show a holder are listed, so a dying holder can tell them.
 TreeNode*& NodesShowing(PropertyHolder& holder);
+// The last slot a holder stores into: slot numbers travel as a property's 8-bit index.
+inline constexpr int kMaxSlot = 127;
+// Stores property (not null) in slot index of holder, whose name list now has numNames
+// names, growing the slots as AddProperty does. Returns 1.
+std::int64_t StoreProperty(PropertyHolder& holder, int index, int numNames,
+                           const CommonI::RefCountPtr<VnI::IProperty>& property);
 } // namespace detail
 
 class VENLOMER_API PropertyHolder : public VnI::IPropertyHolder {
@@ -92,6 +98,8 @@ public:
 
 private:
     friend TreeNode*& detail::NodesShowing(PropertyHolder& holder);
+    friend std::int64_t detail::StoreProperty(PropertyHolder& holder, int index, int numNames,
+                                              const CommonI::RefCountPtr<VnI::IProperty>& property);
 
     PropertyHolderImp::Record* m_imp;
 };

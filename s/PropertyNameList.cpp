@@ -120,6 +120,40 @@ void MakeNames(Record& record) {
     record.m_namesMade = true;
 }
 
+// Adds a name the index lacks (key is its text's) at the next position; -1 when the name
+// object cannot be made.
+int AddAbsent(Record& record, const Port::StringBase<char>& name, const detail::NameIndex::Key& key,
+              VnI::PropertyType type,
+              const CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>& values, bool visible) {
+    if (!record.m_namesMade && MadeAtOnce(type, values)) {
+        MakeNames(record);
+    }
+    if (!record.m_namesMade) {
+        const std::uint32_t position =
+            record.m_nameIndex.Append(name.view(), Packed(type, visible), key);
+        record.m_numVisibleNames += visible ? 1 : 0;
+        return static_cast<int>(position);
+    }
+    auto created = PropertyName::CreateInstance(name, type, values, visible);
+    if (!created) {
+        return -1;
+    }
+    // Either structure may fail to grow. The vector goes first because taking its last
+    // element back cannot fail; an index that kept a name the vector lacks would put
+    // every later name one position too high (and with it holder slots and indices).
+    auto& names = record.names;
+    names.push_back(std::move(created));
+    std::uint32_t position = 0;
+    try {
+        position = record.m_nameIndex.Append(name.view(), Packed(type, visible), key);
+    } catch (...) {
+        names.pop_back();
+        throw;
+    }
+    record.m_numVisibleNames += visible ? 1 : 0;
+    return static_cast<int>(position);
+}
+
 } // namespace PropertyNameListImp
 
 PropertyNameList::PropertyNameList() : m_imp(new PropertyNameListImp::Record(this)) {}
@@ -168,38 +202,31 @@ int PropertyNameList::AddName(const Port::StringBase<char>& name, VnI::PropertyT
 int PropertyNameList::AddEnumName(const Port::StringBase<char>& name, VnI::PropertyType type,
                                   const CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>& values,
                                   bool visible) {
-    if (Contains(name) != -1) {
+    const auto key = detail::NameIndex::MakeKey(name.view());
+    if (m_imp->m_nameIndex.Find(name.view(), key) != -1) {
         return -1;
     }
-    auto& record = *m_imp;
-    if (!record.m_namesMade && PropertyNameListImp::MadeAtOnce(type, values)) {
-        PropertyNameListImp::MakeNames(record);
+    return PropertyNameListImp::AddAbsent(*m_imp, name, key, type, values, visible);
+}
+
+int detail::PositionAddingName(PropertyNameList& list, const Port::StringBase<char>& name,
+                               VnI::IProperty& property, bool visible, int maxPosition) {
+    auto& record = *list.m_imp;
+    const auto key = detail::NameIndex::MakeKey(name.view());
+    const int found = record.m_nameIndex.Find(name.view(), key);
+    if (found >= 0) {
+        return found;
     }
-    if (!record.m_namesMade) {
-        const std::uint32_t position =
-            record.m_nameIndex.Append(name.view(), PropertyNameListImp::Packed(type, visible));
-        record.m_numVisibleNames += visible ? 1 : 0;
-        return static_cast<int>(position);
-    }
-    auto created = PropertyName::CreateInstance(name, type, values, visible);
-    if (!created) {
+    if (static_cast<std::size_t>(maxPosition) < record.m_nameIndex.Size()) {
         return -1;
     }
-    // Either structure may fail to grow. The vector goes first because taking its last
-    // element back cannot fail; an index that kept a name the vector lacks would put
-    // every later name one position too high (and with it holder slots and indices).
-    auto& names = record.names;
-    names.push_back(std::move(created));
-    std::uint32_t position = 0;
-    try {
-        position =
-            record.m_nameIndex.Append(name.view(), PropertyNameListImp::Packed(type, visible));
-    } catch (...) {
-        names.pop_back();
-        throw;
+    const VnI::PropertyType type = property.GetType();
+    if (type == VnI::ENUM_TYPE) {
+        return PropertyNameListImp::AddAbsent(record, name, key, type, property.GetPossibleValues(),
+                                              visible);
     }
-    record.m_numVisibleNames += visible ? 1 : 0;
-    return static_cast<int>(position);
+    return PropertyNameListImp::AddAbsent(
+        record, name, key, type, CommonI::RefCountPtr<VnI::IPossibleEnumValuesItr>(), visible);
 }
 
 std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
@@ -224,7 +251,8 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
             continue;
         }
         const Port::StringBase<char> text = name->GetName();
-        if (index.Find(text.view()) != -1) {
+        const auto key = detail::NameIndex::MakeKey(text.view());
+        if (index.Find(text.view(), key) != -1) {
             continue;
         }
         const VnI::PropertyType type = name->GetType();
@@ -246,7 +274,7 @@ std::int64_t PropertyNameList::AppendList(const VnI::IPropertyNameList* other) {
             }
             staged.push_back(std::move(created));
         }
-        index.Append(text.view(), PropertyNameListImp::Packed(type, isVisible));
+        index.Append(text.view(), PropertyNameListImp::Packed(type, isVisible), key);
         visible += isVisible ? 1 : 0;
     }
     m_imp->names.swap(staged);

@@ -26,6 +26,16 @@ namespace PropertyNameListImp {
 struct Record;
 }
 
+class PropertyNameList;
+
+namespace detail {
+// The position of name in list, found and (when absent) added in one look-up, with the
+// property's type, its possible values and `visible`; a name is added only while the
+// list has at most `maxPosition` names. -1 when absent and not added.
+int PositionAddingName(PropertyNameList& list, const Port::StringBase<char>& name,
+                       VnI::IProperty& property, bool visible, int maxPosition);
+} // namespace detail
+
 class VENLOMER_API PropertyNameList {
 public:
     PropertyNameList();
@@ -58,6 +68,10 @@ public:
     void Dump() const;
 
 private:
+    friend int detail::PositionAddingName(PropertyNameList& list,
+                                          const Port::StringBase<char>& name,
+                                          VnI::IProperty& property, bool visible, int maxPosition);
+
     PropertyNameListImp::Record* m_imp;
 };
 

@@ -11,6 +11,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <vector>
 
 using CommonI::RefCountPtr;
 using Port::StringBase;
@@ -159,9 +160,88 @@ TEST(GenericPropertyHolder, TakesAtMost128Names) {
     }
     EXPECT_EQ(holder.AddProperty("N128", Int(128)), 0);
     EXPECT_EQ(holder.GetNumProperties(), 128);
+    EXPECT_EQ(holder.GetPropertyNames()->GetNumNames(), 128) << "the list is left alone";
     const auto last = holder.GetPropertyByName("N127");
     ASSERT_TRUE(last);
     EXPECT_EQ(last->GetIndex(), 127);
+    // Names already listed are still replaced at the limit.
+    EXPECT_EQ(holder.AddProperty("N127", Int(-1)), 1);
+    EXPECT_EQ(last->GetIndex(), -1);
+    // A name someone else put at position 128 cannot hold a property either.
+    ASSERT_EQ(holder.GetPropertyNames()->AddName("Late", VnI::INT_TYPE, true), 128);
+    EXPECT_EQ(holder.AddProperty("Late", Int(0)), 0);
+    EXPECT_EQ(holder.GetPropertyByName("Late"), nullptr);
+}
+
+// The holder finds or adds a name in one step on its own list; what it stores, and what
+// the list learns, must be what any holder's AddProperty gives.
+TEST(GenericPropertyHolder, AddsReplacesAndListsAsEveryHolderDoes) {
+    GenericPropertyHolder holder;
+    VnI::IPropertyNameList* names = holder.GetPropertyNames();
+    EXPECT_EQ(holder.AddProperty("Bank", RefCountPtr<IProperty>()), 0);
+    EXPECT_EQ(names->GetNumNames(), 0);
+
+    auto first = Int(1);
+    auto second = Int(2);
+    ASSERT_EQ(holder.AddProperty("Spare", first, false), 1);
+    ASSERT_EQ(holder.AddProperty("Spare", second, true), 1);
+    EXPECT_EQ(first->GetIndex(), -1);
+    EXPECT_EQ(second->GetIndex(), 0);
+    EXPECT_EQ(holder.GetNumProperties(), 1);
+    ASSERT_NE(names->GetPropertyName(0), nullptr);
+    EXPECT_FALSE(names->GetPropertyName(0)->IsVisible()) << "visibility is the first add's";
+    EXPECT_EQ(holder.AddProperty("Spare", second), 1) << "the same object again";
+    EXPECT_EQ(second->GetIndex(), 0);
+    EXPECT_EQ(holder.GetNumProperties(), 1);
+
+    std::vector<StringBase<char>> standards{"LVCMOS33", "LVDS"};
+    ASSERT_EQ(holder.AddProperty("Standard", RefCountPtr<IProperty>::Adopt(
+                                                 Vn::Eng::PropertyFactory::CreateEnumProperty(
+                                                     standards, "LVDS", true))),
+              1);
+    VnI::IPropertyName* standard = names->GetPropertyName(1);
+    ASSERT_NE(standard, nullptr);
+    EXPECT_EQ(standard->GetType(), VnI::ENUM_TYPE);
+    std::vector<std::string> values;
+    auto it = standard->GetPossibleValues();
+    for (it->First(); !it->IsEnd(); it->Next()) {
+        values.push_back(it->CurrentItem().str());
+    }
+    EXPECT_EQ(values, (std::vector<std::string>{"LVCMOS33", "LVDS"}));
+
+    // Names added after the list made its name objects go through the same step.
+    ASSERT_EQ(holder.AddProperty("Drive", Int(8)), 1);
+    EXPECT_EQ(names->Contains("Drive"), 2);
+    ASSERT_NE(names->GetPropertyName(2), nullptr);
+    EXPECT_EQ(names->GetPropertyName(2)->GetType(), VnI::INT_TYPE);
+    EXPECT_EQ(holder.GetPropertyByName("Drive")->GetIntProperty(), 8);
+    EXPECT_EQ(holder.GetNumProperties(), 3);
+}
+
+namespace {
+
+// A holder derived from the generic one that files its properties under a shared schema.
+class SchemaHolder final : public GenericPropertyHolder {
+public:
+    explicit SchemaHolder(Vn::Eng::PropertyNameList& schema)
+        : m_schema(static_cast<VnI::IPropertyNameList*>(
+              schema.GetInterface(VnI::IID_IPropertyNameList))) {}
+    VnI::IPropertyNameList* GetPropertyNames() override { return m_schema; }
+
+private:
+    VnI::IPropertyNameList* m_schema;
+};
+
+} // namespace
+
+TEST(GenericPropertyHolder, ADerivedHolderStoresUnderTheListItAnswers) {
+    Vn::Eng::PropertyNameList schema;
+    schema.AddName("Bank", VnI::INT_TYPE, true);
+    SchemaHolder holder(schema);
+    ASSERT_EQ(holder.AddProperty("Pin", Int(3)), 1);
+    EXPECT_EQ(schema.Contains("Pin"), 1);
+    EXPECT_EQ(holder.GetPropertyByName("Pin")->GetIndex(), 1);
+    EXPECT_EQ(holder.GenericPropertyHolder::GetPropertyNames()->GetNumNames(), 0);
 }
 
 namespace {

@@ -188,3 +188,49 @@ TEST(NameIndex, ScannedAndHashedListsGiveTheSameAnswers) {
         EXPECT_EQ(copy.Find(names[count - 1]), static_cast<int>(count - 1));
     }
 }
+
+// Entries and texts share one block and grow at their own paces: long texts after short
+// ones, many short ones after long ones. A copy is cut to size and must grow again on its
+// own, leaving the original as it was; a cleared index reuses its block.
+TEST(NameIndex, TextsAndExtrasSurviveEveryGrowthOfTheBlock) {
+    using Vn::Eng::detail::NameIndex;
+    std::vector<std::string> names;
+    for (std::size_t i = 0; i < 40; ++i) {
+        names.push_back(i % 10 == 3 ? std::string(100 + i, static_cast<char>('a' + i % 26))
+                                    : "p" + std::to_string(i));
+    }
+    NameIndex index;
+    const auto check = [&](const NameIndex& checked, std::size_t count) {
+        ASSERT_EQ(checked.Size(), count);
+        for (std::size_t i = 0; i < count; ++i) {
+            EXPECT_EQ(checked.Text(i), names[i]) << i;
+            EXPECT_EQ(checked.Extra(i), static_cast<std::uint8_t>(i * 7)) << i;
+            EXPECT_EQ(checked.Find(names[i]), static_cast<int>(i)) << i;
+        }
+        for (std::size_t i = count; i < names.size(); ++i) {
+            EXPECT_EQ(checked.Find(names[i]), -1) << i;
+        }
+    };
+    for (std::size_t i = 0; i < 20; ++i) {
+        const auto key = NameIndex::MakeKey(names[i]);
+        ASSERT_EQ(index.Find(names[i], key), -1);
+        ASSERT_EQ(index.Append(names[i], static_cast<std::uint8_t>(i * 7), key), i);
+        check(index, i + 1);
+    }
+    NameIndex copy = index;
+    for (std::size_t i = 20; i < names.size(); ++i) {
+        ASSERT_EQ(copy.Append(names[i], static_cast<std::uint8_t>(i * 7)), i);
+    }
+    check(copy, names.size());
+    check(index, 20);
+    copy = index;
+    check(copy, 20);
+
+    index.Clear();
+    check(index, 0);
+    for (std::size_t i = 0; i < names.size(); ++i) {
+        ASSERT_EQ(index.Append(names[i], static_cast<std::uint8_t>(i * 7)), i);
+    }
+    check(index, names.size());
+    check(copy, 20);
+}

@@ -32,7 +32,8 @@ public:
     /// The entry for name, added holding a null colour when name is new (name is moved
     /// from only then).
     Color& operator[](Port::StringBase<char>&& name) {
-        const int found = m_index.Find(name.view());
+        const auto key = detail::NameIndex::MakeKey(name.view());
+        const int found = m_index.Find(name.view(), key);
         if (found >= 0) {
             return m_entries[static_cast<std::size_t>(found)].second;
         }
@@ -42,7 +43,7 @@ public:
         if (m_entries.size() == m_entries.capacity()) {
             m_entries.reserve(m_entries.empty() ? 16 : m_entries.size() * 2);
         }
-        m_index.Append(name.view());
+        m_index.Append(name.view(), 0, key);
         return m_entries.emplace_back(std::move(name), Color()).second;
     }
     /// The entry for name; throws std::out_of_range when there is none, as a map does.
