@@ -238,12 +238,30 @@ Row Measure(const Target& t, const CollectingReporter& results) {
     return row;
 }
 
+// A figure in the largest unit that keeps it readable in its column: times of a whole
+// file's read run to hundreds of millions of ns, peaks of memory to tens of millions of B.
+std::string Quantity(double value, const char* unit, int width) {
+    char text[32];
+    const bool bytes = unit[0] == 'B';
+    if (bytes && value >= 1024.0 * 1024) {
+        std::snprintf(text, sizeof text, "%*.1f MiB", width - 4, value / (1024.0 * 1024));
+    } else if (!bytes && value >= 1e6) {
+        std::snprintf(text, sizeof text, "%*.1f ms", width - 3, value / 1e6);
+    } else {
+        std::snprintf(text, sizeof text, "%*.1f %-2s", width - 3, value, unit);
+    }
+    return text;
+}
+
 std::string FormatRatios(const Row& row) {
     std::string text;
     for (std::size_t r = 0; r < kRuns; ++r) {
         char cell[16];
         const double v = row.Ratio(r);
-        if (v == v) {
+        if (v == v && !row.HasBaseline() && row.unit[0] == 'B' && v >= 1024.0 * 1024) {
+            // No baseline: the "ratio" is the figure itself.
+            std::snprintf(cell, sizeof cell, "%5.1fMi", v / (1024.0 * 1024));
+        } else if (v == v) {
             std::snprintf(cell, sizeof cell, v < 100 ? "%7.3f" : "%7.0f", v);
         } else {
             std::snprintf(cell, sizeof cell, "%7s", "-");
@@ -294,12 +312,11 @@ int PrintTable(const CollectingReporter& results, const std::string& loadBefore)
                       : row.BeyondLimitInEveryRun() ? "bound exceeds the limit"
                                                     : "bound exceeds it in some runs";
         }
-        char base[16] = "-";
-        if (row.HasBaseline()) {
-            std::snprintf(base, sizeof base, "%9.1f %-2s", Row::Best(row.baseline), row.unit);
-        }
-        std::printf("%-46s %9.1f %-2s %12s  %-21s  %-36s %s\n", t.measurement, Row::Best(row.ours),
-                    row.unit, base, FormatRatios(row).c_str(), t.wording, verdict);
+        const std::string base =
+            row.HasBaseline() ? Quantity(Row::Best(row.baseline), row.unit, 12) : "-";
+        std::printf("%-46s %12s %12s  %-21s  %-36s %s\n", t.measurement,
+                    Quantity(Row::Best(row.ours), row.unit, 12).c_str(), base.c_str(),
+                    FormatRatios(row).c_str(), t.wording, verdict);
     }
     if (GetSizes().tiny) {
         std::printf(
