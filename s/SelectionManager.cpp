@@ -261,7 +261,7 @@ void Record::SelectWithChildren(VnI::IPropertyHolder* holder, bool withChildren)
         children.Next();
         // A child without a holder is a group node: it is skipped with its subtree.
         VnI::IPropertyHolder* below = child ? child->GetDataRef() : nullptr;
-        if (Select(below)) {
+        if (below != nullptr && Select(below)) {
             descend(below);
         }
     }

@@ -258,6 +258,7 @@ TEST(PointerIndexTable, LargeTableIsAdvisedForHugePagesAndStartsEmpty) {
     }
     constexpr std::uintptr_t kHuge = std::uintptr_t{1} << 21;
     const auto first = reinterpret_cast<std::uintptr_t>(table.data());
+    // NOLINTNEXTLINE(performance-no-int-to-ptr): an address to look up, never dereferenced
     const void* interior = reinterpret_cast<const void*>((first + kHuge - 1) & ~(kHuge - 1));
     const std::string flags = VmFlagsOf(interior);
     ASSERT_FALSE(flags.empty()) << "no mapping found for the table in /proc/self/smaps";
