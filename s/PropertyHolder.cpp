@@ -4,6 +4,7 @@
 #include "s/PropertyHolder.h"
 
 #include "s/PropertyItr.h"
+#include "s/internal/Lookahead.h"
 #include "s/internal/Shapes.h"
 #include "s/internal/TreeLinks.h"
 
@@ -35,6 +36,10 @@ struct Record {
 
 TreeNode*& detail::NodesShowing(PropertyHolder& holder) {
     return holder.m_imp->m_nodesShowing;
+}
+
+void detail::HintRecord(const PropertyHolder& holder) {
+    Hint(holder.m_imp);
 }
 
 std::int64_t detail::StoreProperty(PropertyHolder& holder, int index, int names,

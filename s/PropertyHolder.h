@@ -43,6 +43,8 @@ inline constexpr int kMaxSlot = 127;
 // names, growing the slots as AddProperty does. Returns 1.
 std::int64_t StoreProperty(PropertyHolder& holder, int index, int numNames,
                            const CommonI::RefCountPtr<VnI::IProperty>& property);
+// A hint for a walk over many holders (s/internal/Lookahead.h): the holder's record.
+void HintRecord(const PropertyHolder& holder);
 } // namespace detail
 
 class VENLOMER_API PropertyHolder : public VnI::IPropertyHolder {
@@ -100,6 +102,7 @@ private:
     friend TreeNode*& detail::NodesShowing(PropertyHolder& holder);
     friend std::int64_t detail::StoreProperty(PropertyHolder& holder, int index, int numNames,
                                               const CommonI::RefCountPtr<VnI::IProperty>& property);
+    friend void detail::HintRecord(const PropertyHolder& holder);
 
     PropertyHolderImp::Record* m_imp;
 };

@@ -4,7 +4,10 @@
 #include "s/PropertyHolderItr.h"
 
 #include "s/internal/ListCursor.h"
+#include "s/internal/Lookahead.h"
 #include "s/internal/Shapes.h"
+
+#include <typeinfo>
 
 namespace Vn::Eng {
 
@@ -18,6 +21,20 @@ struct Record : detail::ListCursor<PropertyHolderItr, VnI::IPropertyHolder> {
     using ListCursor::ListCursor;
 };
 } // namespace PropertyHolderItrImp
+
+const PropertyHolderList* detail::WalkedList(VnI::IPropertyHolderItr& itr,
+                                             PropertyHolderList::const_iterator& at) {
+    // Exactly this class: a subclass may step differently.
+    if (typeid(itr) != typeid(PropertyHolderItr)) {
+        return nullptr;
+    }
+    const auto& cursor = *static_cast<PropertyHolderItr&>(itr).m_imp;
+    if (cursor.IsEnd()) {
+        return nullptr;
+    }
+    at = cursor.m_itr;
+    return cursor.m_list;
+}
 
 CommonI::RefCountPtr<VnI::IPropertyHolderItr>
 PropertyHolderItr::CreateInstance(const PropertyHolderList* list) {

@@ -21,6 +21,12 @@ namespace PropertyHolderItrImp {
 struct Record;
 }
 
+namespace detail {
+// The list walked and the position, for a walk that looks ahead (s/internal/Lookahead.h).
+const PropertyHolderList* WalkedList(VnI::IPropertyHolderItr& itr,
+                                     PropertyHolderList::const_iterator& at);
+} // namespace detail
+
 class VENLOMER_API PropertyHolderItr : public VnI::IPropertyHolderItr {
 public:
     /// A new iterator standing on the list's first element (count 1, adopted). A null list
@@ -42,6 +48,9 @@ public:
     void Dump() const;
 
 private:
+    friend const PropertyHolderList* detail::WalkedList(VnI::IPropertyHolderItr& itr,
+                                                        PropertyHolderList::const_iterator& at);
+
     PropertyHolderItrImp::Record* m_imp;
 };
 

@@ -1,7 +1,9 @@
 //===-- tests/FindItrTest.cpp - the search yields exactly the holders that match --===//
+#include "FakeHolders.h"
 #include "MessageCapture.h"
 #include "Slots.h"
 
+#include "s/DeviceResource.h"
 #include "s/FindItr.h"
 #include "s/GenericPropertyHolder.h"
 #include "s/Property.h"
@@ -10,7 +12,10 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <iterator>
 #include <memory>
+#include <utility>
 #include <vector>
 
 using CommonI::RefCountPtr;
@@ -245,6 +250,137 @@ TEST(FindItr, AHostsStringPropertyAnswersThroughItsOwnMethods) {
     EXPECT_EQ(Search(h, "Name", RefCountPtr<VnI::IProperty>::Adopt(new ReportedText("x", "bank7")),
                      VnI::MATCH_EXACT),
               (V{h[1], &host}));
+}
+
+namespace {
+
+// A host's holder that is no PropertyHolder at all, with one "Bank".
+class ForeignBank final : public VnTest::FakeHolder {
+public:
+    explicit ForeignBank(int bank) : FakeHolder(0), m_bank(Int(bank)) {}
+    RefCountPtr<VnI::IProperty> GetPropertyByName(const StringBase<char>& name) override {
+        return name == StringBase<char>("Bank") ? m_bank : nullptr;
+    }
+
+private:
+    RefCountPtr<VnI::IProperty> m_bank;
+};
+
+class PinBank final : public Vn::Eng::DeviceResource {
+public:
+    PinBank(VnI::IPropertyNameList* names, int bank) : m_names(names) {
+        AddProperty("Bank", Int(bank));
+    }
+    StringBase<char> GetName() override { return {}; }
+    VnI::IPropertyNameList* GetPropertyNames() override { return m_names; }
+    StringBase<char> GetTileName() const override { return {}; }
+    std::int64_t GetLocation(int&, int&) const override { return 0; }
+    StringBase<char> GetSiteType() const override { return {}; }
+
+private:
+    VnI::IPropertyNameList* m_names;
+};
+
+} // namespace
+
+TEST(FindItr, OverAnyMixOfHoldersAListSearchYieldsEachMatchInOrder) {
+    GenericPropertyHolder schema; // the pins share its name list
+    schema.AddProperty("Bank", Int(0));
+    std::vector<std::unique_ptr<IPropertyHolder>> owned;
+    PropertyHolderList list;
+    // Runs of every kind and length, so matches fall next to each other, a few apart, at
+    // either end, and next to holders of another class, null or without the property.
+    for (int i = 0; i < 64; ++i) {
+        const int bank = (i * 7 + i / 5) % 3;
+        switch ((i * 5 + i / 9) % 6) {
+        case 0:
+            owned.push_back(std::make_unique<ForeignBank>(bank));
+            break;
+        case 1:
+        case 2:
+            owned.push_back(std::make_unique<PinBank>(schema.GetPropertyNames(), bank));
+            break;
+        case 3:
+            list.push_back(nullptr);
+            continue;
+        case 4:
+            owned.push_back(std::make_unique<GenericPropertyHolder>());
+            owned.back()->AddProperty("Other", Int(bank), true);
+            break;
+        default:
+            owned.push_back(std::make_unique<GenericPropertyHolder>());
+            owned.back()->AddProperty("Bank", Int(bank), true);
+            break;
+        }
+        list.push_back(owned.back().get());
+    }
+    for (size_t length : {size_t{0}, size_t{1}, size_t{2}, size_t{3}, size_t{5}, list.size()}) {
+        for (int bank = 0; bank < 3; ++bank) {
+            PropertyHolderList part(list.begin(),
+                                    std::next(list.begin(), static_cast<long>(length)));
+            std::vector<IPropertyHolder*> expected;
+            for (IPropertyHolder* holder : part) {
+                auto property = holder != nullptr ? holder->GetPropertyByName("Bank") : nullptr;
+                if (property && property->GetIntProperty() == bank) {
+                    expected.push_back(holder);
+                }
+            }
+            EXPECT_EQ(
+                Yielded(FindItr::CreateInstance(Vn::Eng::PropertyHolderItr::CreateInstance(&part),
+                                                "Bank", Wanted(Int(bank)), VnI::MATCH_EXACT)),
+                expected)
+                << length << " holders, bank " << bank;
+        }
+    }
+}
+
+namespace {
+
+// A holder whose look-up edits the list being searched, once: it frees the node `away`
+// places after its own and puts `replacement` at the end, so the list keeps its length.
+class ListEditingHolder final : public GenericPropertyHolder {
+public:
+    ListEditingHolder(PropertyHolderList& list, long away, IPropertyHolder* replacement)
+        : m_list(list), m_away(away), m_replacement(replacement) {
+        AddProperty("Bank", Int(2)); // no match: the search steps on past it
+    }
+    RefCountPtr<VnI::IProperty> GetPropertyByName(const StringBase<char>& name) override {
+        if (m_replacement != nullptr) {
+            auto self = std::find(m_list.begin(), m_list.end(), this);
+            m_list.erase(std::next(self, m_away));
+            m_list.push_back(std::exchange(m_replacement, nullptr));
+        }
+        return GenericPropertyHolder::GetPropertyByName(name);
+    }
+
+private:
+    PropertyHolderList& m_list;
+    long m_away;
+    IPropertyHolder* m_replacement;
+};
+
+} // namespace
+
+TEST(FindItr, AHolderThatEditsTheListAheadIsFollowedAsTheListNowStands) {
+    const int banks[] = {1, 2, 1, 1, 2, 1};
+    for (size_t away = 1; away <= 4; ++away) {
+        Holders h;
+        for (int bank : banks) {
+            h.Bank(bank);
+        }
+        GenericPropertyHolder replacement;
+        replacement.AddProperty("Bank", Int(1));
+        ListEditingHolder editor(h.list, static_cast<long>(away), &replacement);
+        h.list.push_front(&editor);
+        std::vector<IPropertyHolder*> expected;
+        for (size_t i = 0; i < std::size(banks); ++i) {
+            if (banks[i] == 1 && i + 1 != away) {
+                expected.push_back(h[i]);
+            }
+        }
+        expected.push_back(&replacement);
+        EXPECT_EQ(Search(h, "Bank", Int(1), VnI::MATCH_EXACT), expected) << "away " << away;
+    }
 }
 
 TEST(FindItr, AnswersItselfAndItsCounterAndHoldsItsArguments) {
