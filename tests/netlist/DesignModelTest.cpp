@@ -576,6 +576,66 @@ TEST_F(NetlistFiles, ARowWhoseParentIsNotInTheFileIsRefused) {
     }
 }
 
+TEST_F(NetlistFiles, RowsNumberedWithGapsOrFarApartFindTheirOwners) {
+    // Writers number rows 1, 2, 3, ..., but another program may leave gaps, start below
+    // zero or use ids near the ends of the range: each row must still land under the
+    // owner its id names, and an id in a gap names none.
+    const auto outside = [this](const std::string& name, const std::string& more) {
+        std::string path = PathOf(name);
+        ExecSql(path, VnTest::kOutsideSchema);
+        ExecSql(path, ("INSERT INTO nmod_format VALUES (1, 'NGD', " +
+                       std::to_string(Nmod_Model::kFormatVersion) +
+                       ", 'm', 't', 'v');"
+                       "INSERT INTO nmod_design VALUES (-3, 'low'), (5, 'mid'), "
+                       "(1000000000000, 'high');"
+                       "INSERT INTO nmod_view VALUES (9000000000000000000, -3, 'UP'), "
+                       "(-9000000000000000000, 1000000000000, 'DOWN'), (2, 5, 'MID');"
+                       "INSERT INTO nmod_view_property VALUES (2, 'PART', 'Pmid'), "
+                       "(-9000000000000000000, 'PART', 'Phigh'), "
+                       "(9000000000000000000, 'PART', 'Plow');"
+                       "INSERT INTO nmod_block VALUES (1, 2, 'Bmid', 0), "
+                       "(2, 9000000000000000000, 'Blow', 0);" +
+                       more)
+                          .c_str());
+        return path;
+    };
+    const auto model = ReadNetlist(outside("sparse.ngd", ""));
+    ASSERT_NE(model, nullptr);
+    const struct {
+        const char* design;
+        const char* view;
+        const char* part;
+        const char* block;
+    } expected[] = {{"low", "UP", "Plow", "Blow"},
+                    {"mid", "MID", "Pmid", "Bmid"},
+                    {"high", "DOWN", "Phigh", nullptr}};
+    for (const auto& [design, view, part, block] : expected) {
+        SCOPED_TRACE(design);
+        Nmod_Design* owner = model->GetDesignMgr()->GetDesignByName(design);
+        ASSERT_NE(owner, nullptr);
+        ASSERT_EQ(owner->GetViewItr().GetCount(), 1u);
+        Nmod_View* read = owner->GetViewByName(view);
+        ASSERT_NE(read, nullptr);
+        EXPECT_EQ(read->GetNumProperties(), 1u);
+        EXPECT_STREQ(read->GetPropertyString("PART"), part);
+        if (block == nullptr) {
+            EXPECT_EQ(read->GetBlock(), nullptr);
+        } else {
+            ASSERT_NE(read->GetBlock(), nullptr);
+            EXPECT_STREQ(read->GetBlock()->GetName(), block);
+        }
+    }
+
+    ExpectRefusedAsFormat(outside("gap-design.ngd", "INSERT INTO nmod_view VALUES (3, 4, 'X')"),
+                          "a view of a design it does not hold");
+    ExpectRefusedAsFormat(outside("gap-view.ngd", "INSERT INTO nmod_view_property VALUES "
+                                                  "(3, 'X', 'y')"),
+                          "a property of a view it does not hold");
+    ExpectRefusedAsFormat(outside("below.ngd", "INSERT INTO nmod_block VALUES (3, "
+                                               "-9223372036854775808, 'X', 0)"),
+                          "a block of a view it does not hold");
+}
+
 namespace {
 
 bool IsWalMode(const std::string& path) {

@@ -72,8 +72,13 @@ Nmod_View* Access::AddView(Nmod_Design& design, long long id, std::string name) 
     return design.m_views.back().get();
 }
 
-void Access::AddProperty(Nmod_View& view, std::string name, std::string value) {
+std::size_t Access::AddProperty(Nmod_View& view, std::string name, std::string value) {
     view.m_properties.emplace_back(std::move(name), std::move(value));
+    return view.m_properties.size() - 1;
+}
+
+const std::string& Access::PropertyName(const Nmod_View& view, std::size_t place) {
+    return view.m_properties[place].first;
 }
 
 void Access::AddBlock(Nmod_View& view, std::string name, unsigned int type) {

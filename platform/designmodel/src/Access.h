@@ -39,7 +39,9 @@ struct Access {
                                                     const std::string& fileName, bool ngd);
     static Nmod_Design* AddDesign(Nmod_Model& model, long long id, std::string name);
     static Nmod_View* AddView(Nmod_Design& design, long long id, std::string name);
-    static void AddProperty(Nmod_View& view, std::string name, std::string value);
+    /// Returns the property's place among the view's, for PropertyName.
+    static std::size_t AddProperty(Nmod_View& view, std::string name, std::string value);
+    static const std::string& PropertyName(const Nmod_View& view, std::size_t place);
     static void AddBlock(Nmod_View& view, std::string name, unsigned int type);
     static void OpenReadTxn(Nmod_Model& model);
 };

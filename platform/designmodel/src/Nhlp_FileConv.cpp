@@ -5,6 +5,7 @@
 
 #include "Access.h"
 #include "Engine.h"
+#include "ReadIndex.h"
 #include "Schema.h"
 #include "designmodel/Nmod_Exception.h"
 #include "designmodel/Nmod_Model.h"
@@ -16,8 +17,8 @@
 #include <memory>
 #include <sys/stat.h>
 #include <unistd.h>
-#include <unordered_map>
-#include <unordered_set>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -88,14 +89,6 @@ long long IntColumn(const Statement& row, int column, const char* what, const st
     return row.Int(column);
 }
 
-// A key unique per (owner row, name): the id takes a fixed width, so no name can make
-// two different pairs meet.
-std::string OwnedKey(long long owner, const std::string& name) {
-    std::string key(sizeof owner, '\0');
-    std::memcpy(key.data(), &owner, sizeof owner);
-    return key + name;
-}
-
 // Where a file is read from, and what its refusals say.
 struct Source {
     const Nmod_Detail::Connection& db;
@@ -103,18 +96,19 @@ struct Source {
     const std::string& context;
 };
 
-template <class Parent> using RowsById = std::unordered_map<long long, Parent*>;
+using Nmod_Detail::RowsById;
+using Nmod_Detail::SeenNames;
 
 // The object a row hangs under; a row whose parent id names no row read before is
 // refused with `orphan` ("a view of a design"), as the file then holds a dangling link.
 template <class Parent>
 Parent& ParentRow(const RowsById<Parent>& parents, long long id, const char* orphan,
                   const std::string& file) {
-    const auto found = parents.find(id);
-    if (found == parents.end()) {
+    Parent* parent = parents.Find(id);
+    if (parent == nullptr) {
         Refuse(file, std::string(orphan) + " it does not hold");
     }
-    return *found->second;
+    return *parent;
 }
 
 // The format record: which kind of database and which version, and the model's names.
@@ -143,43 +137,56 @@ std::unique_ptr<Nmod_Model> ReadFormat(const Source& from) {
         TextColumn(format, 4, "tool version", file), file, kind == Nmod_Detail::kKindNgd);
 }
 
-// Duplicates are found through hash sets: a file of many designs, views or properties
-// is read in time proportional to its size.
+// Duplicates are found through hashes of the names already read, so a file of many
+// designs, views or properties is read in time proportional to its size.
 
 RowsById<Nmod_Design> ReadDesigns(const Source& from, Nmod_Model& model) {
     RowsById<Nmod_Design> designs;
-    std::unordered_set<std::string> names;
+    SeenNames names;
     Statement rows(from.db, "SELECT id, name FROM nmod_design ORDER BY id", from.context);
     while (rows.Step()) {
         const long long id = IntColumn(rows, 0, "design id", from.file);
         std::string name = TextColumn(rows, 1, "design name", from.file);
-        if (!names.insert(name).second) {
+        SeenNames::Probe probe;
+        const auto isDesign = [&](std::size_t entry) {
+            return designs.At(entry)->GetName() == name;
+        };
+        if (names.Contains(0, name, isDesign, probe)) {
             Refuse(from.file, "design \"" + name + "\" twice");
         }
-        designs[id] = Nmod_Detail::Access::AddDesign(model, id, std::move(name));
+        names.Remember(probe, designs.Size());
+        designs.Add(id, Nmod_Detail::Access::AddDesign(model, id, std::move(name)));
     }
     return designs;
 }
 
 RowsById<Nmod_View> ReadViews(const Source& from, const RowsById<Nmod_Design>& designs) {
     RowsById<Nmod_View> views;
-    std::unordered_set<std::string> names;
+    SeenNames names;
     Statement rows(from.db, "SELECT id, design_id, name FROM nmod_view ORDER BY id", from.context);
     while (rows.Step()) {
         const long long id = IntColumn(rows, 0, "view id", from.file);
         const long long designId = IntColumn(rows, 1, "view's design", from.file);
         Nmod_Design& design = ParentRow(designs, designId, "a view of a design", from.file);
         std::string name = TextColumn(rows, 2, "view name", from.file);
-        if (!names.insert(OwnedKey(designId, name)).second) {
+        SeenNames::Probe probe;
+        const auto isView = [&](std::size_t entry) {
+            const Nmod_View* view = views.At(entry);
+            return view->GetDesign() == &design && view->GetName() == name;
+        };
+        if (names.Contains(designId, name, isView, probe)) {
             Refuse(from.file, "view \"" + name + "\" of design \"" + design.GetName() + "\" twice");
         }
-        views[id] = Nmod_Detail::Access::AddView(design, id, std::move(name));
+        names.Remember(probe, views.Size());
+        views.Add(id, Nmod_Detail::Access::AddView(design, id, std::move(name)));
     }
     return views;
 }
 
 void ReadProperties(const Source& from, const RowsById<Nmod_View>& views) {
-    std::unordered_set<std::string> names;
+    // Where each property read went: the view's list may move its names as it grows.
+    std::vector<std::pair<const Nmod_View*, std::size_t>> read;
+    SeenNames names;
     Statement rows(from.db, "SELECT view_id, name, value FROM nmod_view_property ORDER BY rowid",
                    from.context);
     while (rows.Step()) {
@@ -187,10 +194,17 @@ void ReadProperties(const Source& from, const RowsById<Nmod_View>& views) {
         Nmod_View& view = ParentRow(views, viewId, "a property of a view", from.file);
         std::string name = TextColumn(rows, 1, "property name", from.file);
         std::string value = TextColumn(rows, 2, "property value", from.file);
-        if (!names.insert(OwnedKey(viewId, name)).second) {
+        SeenNames::Probe probe;
+        const auto isProperty = [&](std::size_t entry) {
+            const auto& [owner, place] = read[entry];
+            return owner == &view && Nmod_Detail::Access::PropertyName(*owner, place) == name;
+        };
+        if (names.Contains(viewId, name, isProperty, probe)) {
             Refuse(from.file, "property \"" + name + "\" of view \"" + view.GetName() + "\" twice");
         }
-        Nmod_Detail::Access::AddProperty(view, std::move(name), std::move(value));
+        names.Remember(probe, read.size());
+        read.emplace_back(
+            &view, Nmod_Detail::Access::AddProperty(view, std::move(name), std::move(value)));
     }
 }
 
