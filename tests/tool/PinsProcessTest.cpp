@@ -28,18 +28,11 @@ namespace {
 
 namespace fs = std::filesystem;
 using VnTest::Contains;
+using VnTest::LineCount;
 using VnTest::Quote;
 using VnTest::Result;
 using VnTest::Slurp;
 using VnTest::WriteBytes;
-
-int Lines(const std::string& text) {
-    int lines = 0;
-    for (char c : text) {
-        lines += c == '\n' ? 1 : 0;
-    }
-    return lines;
-}
 
 bool OnPath(const std::string& program) {
     return std::system(("command -v " + program + " >/dev/null 2>&1").c_str()) == 0;
@@ -166,7 +159,7 @@ TEST_F(PinsProcess, EachPinsCommandHasHelpAndBadUsageIsExitTwoWithOneLine) {
             shown += arg + " ";
         }
         EXPECT_EQ(result.status, 2) << shown << result.err;
-        EXPECT_EQ(Lines(result.err), 1) << shown << result.err;
+        EXPECT_EQ(LineCount(result.err), 1) << shown << result.err;
         EXPECT_FALSE(fs::exists(m_dir / "x.pcf")) << shown;
     }
 }
@@ -179,7 +172,7 @@ TEST_F(PinsProcess, AssignCreatesTheFileThenChecksCleanAndKeepsWhatItDoesNotOwn)
     EXPECT_TRUE(Contains(made.out, "Created " + pcf.string() + ": 10 set_io lines")) << made.out;
     std::string text = Slurp(pcf);
     EXPECT_TRUE(Contains(text, "set_io clk 21\n")) << text;
-    EXPECT_EQ(Lines(text), 10) << text;
+    EXPECT_EQ(LineCount(text), 10) << text;
 
     // The user's lines survive a reassignment; only the moved port's line changes.
     WriteBytes(pcf, "# board rev B\nset_frequency clk 12\n" + text);
@@ -239,7 +232,7 @@ TEST_F(PinsProcess, RefusedAssignmentsAndBadInputLeaveEveryFileUntouched) {
     for (const Case& c : cases) {
         Result result = Pins("assign", pcf.string(), c.args);
         EXPECT_EQ(result.status, 1) << c.says;
-        EXPECT_EQ(Lines(result.err), 1) << result.err;
+        EXPECT_EQ(LineCount(result.err), 1) << result.err;
         EXPECT_TRUE(Contains(result.err, c.says)) << result.err;
         EXPECT_TRUE(Contains(result.err, "left untouched")) << result.err;
         ExpectUntouched(pcf, before, c.says);
@@ -283,7 +276,7 @@ TEST_F(PinsProcess, RefusedAssignmentsAndBadInputLeaveEveryFileUntouched) {
             std::string said = result.err + result.out;
             EXPECT_TRUE(Contains(said, bad.says)) << command << "\n" << said;
             if (std::string(command) == "assign") {
-                EXPECT_EQ(Lines(result.err), 1) << result.err;
+                EXPECT_EQ(LineCount(result.err), 1) << result.err;
             }
             ExpectUntouched(bad.pcf, pcfBefore, bad.says);
         }

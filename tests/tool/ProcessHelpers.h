@@ -47,4 +47,13 @@ inline bool Contains(const std::string& text, const std::string& part) {
     return text.find(part) != std::string::npos;
 }
 
+// The line ends in a text: how the tests count the lines of a message or a listing.
+inline int LineCount(const std::string& text) {
+    int lines = 0;
+    for (char c : text) {
+        lines += c == '\n' ? 1 : 0;
+    }
+    return lines;
+}
+
 } // namespace VnTest

@@ -28,18 +28,11 @@ namespace {
 
 namespace fs = std::filesystem;
 using VnTest::Contains;
+using VnTest::LineCount;
 using VnTest::Quote;
 using VnTest::Result;
 using VnTest::Slurp;
 using VnTest::WriteBytes;
-
-int LineCount(const std::string& text) {
-    int lines = 0;
-    for (char c : text) {
-        lines += c == '\n' ? 1 : 0;
-    }
-    return lines;
-}
 
 class ToolProcess : public ::testing::Test {
 protected:
