@@ -328,10 +328,12 @@ void RegisterBaselines() {
         ->Iterations(1);
     benchmark::RegisterBenchmark("bytes/one_bare_list", BareListBytes, sizes.large, 1)
         ->Iterations(1);
-    benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small)
-        ->Iterations(sizes.tiny ? 1 : 30);
-    benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large)
-        ->Iterations(sizes.tiny ? 1 : 3);
+    ScalingSide(
+        benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small),
+        30);
+    ScalingSide(
+        benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large),
+        1);
 }
 
 } // namespace VnBench

@@ -336,13 +336,10 @@ void RegisterHolderBenchmarks() {
     benchmark::RegisterBenchmark("search_regex/finditr_icase_substring", Search, "Name",
                                  Text("bank3_"), VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING)
         ->Iterations(repeat);
-    benchmark::RegisterBenchmark("tree_siblings/small", Tree, sizes.small, false)
-        ->Iterations(repeat * 10);
-    benchmark::RegisterBenchmark("tree_siblings/large", Tree, sizes.large, false)
-        ->Iterations(repeat);
-    benchmark::RegisterBenchmark("tree_chain/small", Tree, sizes.small, true)
-        ->Iterations(repeat * 10);
-    benchmark::RegisterBenchmark("tree_chain/large", Tree, sizes.large, true)->Iterations(repeat);
+    ScalingSide(benchmark::RegisterBenchmark("tree_siblings/small", Tree, sizes.small, false), 30);
+    ScalingSide(benchmark::RegisterBenchmark("tree_siblings/large", Tree, sizes.large, false), 1);
+    ScalingSide(benchmark::RegisterBenchmark("tree_chain/small", Tree, sizes.small, true), 30);
+    ScalingSide(benchmark::RegisterBenchmark("tree_chain/large", Tree, sizes.large, true), 1);
 }
 
 } // namespace VnBench
