@@ -311,29 +311,26 @@ void RegisterBaselines() {
     PerCall(benchmark::RegisterBenchmark("lookup/bag_map", LookupInBags<OrderedBag>));
     PerCall(benchmark::RegisterBenchmark("lookup/floor", LookupFloor));
     benchmark::RegisterBenchmark("bytes/bag_unordered_map", BagBytes)->Iterations(1);
-    benchmark::RegisterBenchmark("search_int/bags", SearchBagsIntExact)
-        ->Iterations(sizes.tiny ? 1 : 5);
-    benchmark::RegisterBenchmark("search_regex/bags_std_regex_per_item", SearchBagsStdRegexPerItem)
-        ->Iterations(1);
+    Passes(benchmark::RegisterBenchmark("search_int/bags", SearchBagsIntExact), 1);
+    Passes(benchmark::RegisterBenchmark("search_regex/bags_std_regex_per_item",
+                                        SearchBagsStdRegexPerItem),
+           1);
     benchmark::RegisterBenchmark("selection/list_small", ListSelection, sizes.small)->Iterations(1);
     benchmark::RegisterBenchmark("selection/list_medium", ListSelection, sizes.medium)
         ->Iterations(1);
     PerCall(benchmark::RegisterBenchmark("colour/unordered_map", TileColourMap));
-    benchmark::RegisterBenchmark("search_regex/bags_std_regex_once", SearchBagsStdRegexOnce)
-        ->Iterations(1);
-    benchmark::RegisterBenchmark("search_regex/re2_names", SearchNamesRe2)
-        ->Iterations(sizes.tiny ? 1 : 3);
+    Passes(benchmark::RegisterBenchmark("search_regex/bags_std_regex_once", SearchBagsStdRegexOnce),
+           1);
+    Passes(benchmark::RegisterBenchmark("search_regex/re2_names", SearchNamesRe2), 1);
     PerCall(benchmark::RegisterBenchmark("generic/build_bags_16", BuildBags));
     benchmark::RegisterBenchmark("bytes/two_bare_lists", BareListBytes, sizes.large, 2)
         ->Iterations(1);
     benchmark::RegisterBenchmark("bytes/one_bare_list", BareListBytes, sizes.large, 1)
         ->Iterations(1);
-    ScalingSide(
-        benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small),
-        30);
-    ScalingSide(
-        benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large),
-        1);
+    Passes(benchmark::RegisterBenchmark("reference/list_unlink_small", BareListUnlink, sizes.small),
+           30);
+    Passes(benchmark::RegisterBenchmark("reference/list_unlink_large", BareListUnlink, sizes.large),
+           1);
 }
 
 } // namespace VnBench

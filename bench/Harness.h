@@ -55,14 +55,14 @@ inline void PerCall(benchmark::internal::Benchmark* benchmark) {
 /// dealt round-robin into the runs.
 constexpr int kRuns = 3;
 
-/// One side of a scaling measurement (a million items against ten thousand): each
-/// repetition times `iterations` passes, and each run gets five repetitions, the fastest
-/// of which counts. A pass at a million items takes a fraction of a second and probes
-/// memory far larger than the caches, so one slow pass (a neighbour's burst on the memory
-/// bus, or the first pass in the process, which grows the heap while the other benchmarks
-/// find it grown) must not decide a run's verdict.
-inline void ScalingSide(benchmark::internal::Benchmark* benchmark,
-                        benchmark::IterationCount iterations) {
+/// A measurement that passes over many items (a search of a million resources, one side
+/// of a million-against-ten-thousand comparison): each repetition times `iterations` passes, and
+/// each run gets five repetitions, the fastest of which counts. A pass at a million items takes a
+/// fraction of a second and probes memory far larger than the caches, so one slow pass (a
+/// neighbour's burst on the memory bus, or the first pass in the process, which grows the heap
+/// while the other benchmarks find it grown) must not decide a run's verdict.
+inline void Passes(benchmark::internal::Benchmark* benchmark,
+                   benchmark::IterationCount iterations) {
     constexpr int kPassesPerRun = 5;
     if (GetSizes().tiny) {
         benchmark->Iterations(1);

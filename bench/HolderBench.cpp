@@ -319,27 +319,29 @@ void Tree(benchmark::State& state, size_t count, bool chain) {
 
 void RegisterHolderBenchmarks() {
     const Sizes& sizes = GetSizes();
-    const benchmark::IterationCount repeat = sizes.tiny ? 1 : 3;
     PerCall(benchmark::RegisterBenchmark("lookup/ours", Lookup));
     PerCall(benchmark::RegisterBenchmark("reference/counted_copy", CountedCopy));
     PerCall(benchmark::RegisterBenchmark("reference/position_only", LookupPositionOnly));
     benchmark::RegisterBenchmark("bytes/ours", Bytes)->Iterations(1);
     benchmark::RegisterBenchmark("bytes/generic_16", GenericBytes)->Iterations(1);
     PerCall(benchmark::RegisterBenchmark("generic/build_ours_16", BuildGeneric));
-    benchmark::RegisterBenchmark("search_int/finditr", Search, "X", Int(500), VnI::MATCH_EXACT)
-        ->Iterations(repeat);
-    benchmark::RegisterBenchmark("search_int/hand_loop", HandLoop)->Iterations(repeat);
-    benchmark::RegisterBenchmark("search_int/bound", SearchIntBound)->Iterations(repeat);
-    benchmark::RegisterBenchmark("search_regex/finditr_regexp", Search, "Name", Text("BANK3_.*"),
-                                 VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE)
-        ->Iterations(repeat);
-    benchmark::RegisterBenchmark("search_regex/finditr_icase_substring", Search, "Name",
-                                 Text("bank3_"), VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING)
-        ->Iterations(repeat);
-    ScalingSide(benchmark::RegisterBenchmark("tree_siblings/small", Tree, sizes.small, false), 30);
-    ScalingSide(benchmark::RegisterBenchmark("tree_siblings/large", Tree, sizes.large, false), 1);
-    ScalingSide(benchmark::RegisterBenchmark("tree_chain/small", Tree, sizes.small, true), 30);
-    ScalingSide(benchmark::RegisterBenchmark("tree_chain/large", Tree, sizes.large, true), 1);
+    Passes(
+        benchmark::RegisterBenchmark("search_int/finditr", Search, "X", Int(500), VnI::MATCH_EXACT),
+        1);
+    Passes(benchmark::RegisterBenchmark("search_int/hand_loop", HandLoop), 1);
+    Passes(benchmark::RegisterBenchmark("search_int/bound", SearchIntBound), 1);
+    Passes(benchmark::RegisterBenchmark("search_regex/finditr_regexp", Search, "Name",
+                                        Text("BANK3_.*"),
+                                        VnI::MATCH_REGEXP | VnI::MATCH_IGNORE_CASE),
+           1);
+    Passes(benchmark::RegisterBenchmark("search_regex/finditr_icase_substring", Search, "Name",
+                                        Text("bank3_"),
+                                        VnI::MATCH_IGNORE_CASE | VnI::MATCH_SUBSTRING),
+           1);
+    Passes(benchmark::RegisterBenchmark("tree_siblings/small", Tree, sizes.small, false), 30);
+    Passes(benchmark::RegisterBenchmark("tree_siblings/large", Tree, sizes.large, false), 1);
+    Passes(benchmark::RegisterBenchmark("tree_chain/small", Tree, sizes.small, true), 30);
+    Passes(benchmark::RegisterBenchmark("tree_chain/large", Tree, sizes.large, true), 1);
 }
 
 } // namespace VnBench

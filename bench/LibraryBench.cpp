@@ -251,24 +251,22 @@ void TileSiteColour(benchmark::State& state) {
 
 void RegisterLibraryBenchmarks() {
     const Sizes& sizes = GetSizes();
-    ScalingSide(benchmark::RegisterBenchmark("selection/ours_small", SelectThenRemove, sizes.small),
-                30);
-    ScalingSide(benchmark::RegisterBenchmark("selection/ours_large", SelectThenRemove, sizes.large),
-                1);
-    ScalingSide(
-        benchmark::RegisterBenchmark("highlight/ours_small", HighlightThenRemove, sizes.small), 30);
-    ScalingSide(
-        benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large), 1);
+    Passes(benchmark::RegisterBenchmark("selection/ours_small", SelectThenRemove, sizes.small), 30);
+    Passes(benchmark::RegisterBenchmark("selection/ours_large", SelectThenRemove, sizes.large), 1);
+    Passes(benchmark::RegisterBenchmark("highlight/ours_small", HighlightThenRemove, sizes.small),
+           30);
+    Passes(benchmark::RegisterBenchmark("highlight/ours_large", HighlightThenRemove, sizes.large),
+           1);
     PerCall(benchmark::RegisterBenchmark("colour/GetTileSiteColor", TileSiteColour));
-    ScalingSide(benchmark::RegisterBenchmark("select_from_empty/small", SelectFromEmpty,
-                                             sizes.small, FirstTouch::Reused),
-                30);
-    ScalingSide(benchmark::RegisterBenchmark("select_from_empty/large", SelectFromEmpty,
-                                             sizes.large, FirstTouch::Fresh),
-                1);
-    ScalingSide(benchmark::RegisterBenchmark("reference/two_lists_from_empty_large",
-                                             TwoListsFromEmpty, sizes.large),
-                1);
+    Passes(benchmark::RegisterBenchmark("select_from_empty/small", SelectFromEmpty, sizes.small,
+                                        FirstTouch::Reused),
+           30);
+    Passes(benchmark::RegisterBenchmark("select_from_empty/large", SelectFromEmpty, sizes.large,
+                                        FirstTouch::Fresh),
+           1);
+    Passes(benchmark::RegisterBenchmark("reference/two_lists_from_empty_large", TwoListsFromEmpty,
+                                        sizes.large),
+           1);
     benchmark::RegisterBenchmark("bytes/selection_index_per_listed", IndexBytesPerListedItem, true)
         ->Iterations(1);
     benchmark::RegisterBenchmark("bytes/highlight_index_per_listed", IndexBytesPerListedItem, false)
