@@ -43,24 +43,26 @@ void RegisterLibraryBenchmarks();
 void RegisterHolderBenchmarks();
 void RegisterDesignBenchmarks();
 
-/// A per-call measurement: many short repetitions rather than a few long ones, so a burst
-/// of noise from a neighbour on a shared machine spoils few of them (the fastest counts).
-inline void PerCall(benchmark::internal::Benchmark* benchmark) {
-    if (!GetSizes().tiny) {
-        benchmark->MinTime(0.2)->Repetitions(9);
-    }
-}
-
 /// The whole table is measured this many times; the repetitions of every benchmark are
 /// dealt round-robin into the runs.
 constexpr int kRuns = 3;
 
-/// A measurement that passes over many items (a search of a million resources, one side
-/// of a million-against-ten-thousand comparison): each repetition times `iterations` passes, and
-/// each run gets five repetitions, the fastest of which counts. A pass at a million items takes a
-/// fraction of a second and probes memory far larger than the caches, so one slow pass (a
-/// neighbour's burst on the memory bus, or the first pass in the process, which grows the heap
-/// while the other benchmarks find it grown) must not decide a run's verdict.
+/// A per-call measurement: many short repetitions rather than a few long ones, five to each
+/// run, so that a burst of noise from a neighbour on a shared machine spoils few of them
+/// (the fastest counts).
+inline void PerCall(benchmark::internal::Benchmark* benchmark) {
+    constexpr int kRepetitionsPerRun = 5;
+    if (!GetSizes().tiny) {
+        benchmark->MinTime(0.12)->Repetitions(kRepetitionsPerRun * kRuns);
+    }
+}
+
+/// A measurement that passes over many items (a search of a million resources, one side of
+/// a million-against-ten-thousand comparison): each repetition times `iterations` passes,
+/// and each run gets five repetitions, the fastest of which counts. A pass at a million
+/// items takes a fraction of a second and probes memory far larger than the caches, so one
+/// slow pass (a neighbour's burst on the memory bus, or the first pass in the process, which
+/// grows the heap while the other benchmarks find it grown) must not decide a run's verdict.
 inline void Passes(benchmark::internal::Benchmark* benchmark,
                    benchmark::IterationCount iterations) {
     constexpr int kPassesPerRun = 5;
