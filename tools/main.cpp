@@ -1,4 +1,4 @@
-//===-- tools/main.cpp - venlomer: the library at work without the host ---------===//
+//===-- tools/main.cpp - venlomer: the library at work without the host ---===//
 //
 // The editor that normally hosts the library draws its device views and runs its
 // searches through it; this tool takes the same roads from the command line so that the

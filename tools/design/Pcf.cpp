@@ -1,4 +1,4 @@
-//===-- tools/design/Pcf.cpp - pin constraint files as nextpnr-ice40 reads them --===//
+//===-- tools/design/Pcf.cpp - pin constraint files as nextpnr-ice40 reads them ---===//
 #include "Pcf.h"
 
 #include "Port/SafeFile.h"

@@ -1,4 +1,4 @@
-//===-- tools/design/Pcf.h - pin constraint files as nextpnr-ice40 reads them ----===//
+//===-- tools/design/Pcf.h - pin constraint files as nextpnr-ice40 reads them ---===//
 //
 // \file
 // A constraint file is the user's as much as the tool's: it carries comments, options

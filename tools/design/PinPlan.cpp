@@ -1,4 +1,4 @@
-//===-- tools/design/PinPlan.cpp - checks and automatic assignment of pins -------===//
+//===-- tools/design/PinPlan.cpp - checks and automatic assignment of pins ---===//
 #include "PinPlan.h"
 
 #include <algorithm>

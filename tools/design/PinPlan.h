@@ -1,4 +1,4 @@
-//===-- tools/design/PinPlan.h - checks and automatic assignment of pins ---------===//
+//===-- tools/design/PinPlan.h - checks and automatic assignment of pins ---===//
 //
 // \file
 // Judges a design's ports against a constraint file on one package of a device, the

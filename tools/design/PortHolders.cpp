@@ -1,4 +1,4 @@
-//===-- tools/design/PortHolders.cpp - design ports as the library's holders -----===//
+//===-- tools/design/PortHolders.cpp - design ports as the library's holders ---===//
 #include "PortHolders.h"
 
 #include "CommonI/RefCountPtr.h"

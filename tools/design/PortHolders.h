@@ -1,4 +1,4 @@
-//===-- tools/design/PortHolders.h - design ports as the library's holders -------===//
+//===-- tools/design/PortHolders.h - design ports as the library's holders ---===//
 //
 // \file
 // The editor searches, selects and lists ports with the same library classes it uses

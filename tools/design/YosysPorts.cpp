@@ -1,4 +1,4 @@
-//===-- tools/design/YosysPorts.cpp - the top-level ports of a yosys netlist -----===//
+//===-- tools/design/YosysPorts.cpp - the top-level ports of a yosys netlist ---===//
 #include "YosysPorts.h"
 
 #include "Port/SafeFile.h"

@@ -1,4 +1,4 @@
-//===-- tools/design/YosysPorts.h - the top-level ports of a yosys netlist -------===//
+//===-- tools/design/YosysPorts.h - the top-level ports of a yosys netlist ---===//
 //
 // \file
 // Pin planning needs only the top module's ports of a yosys JSON netlist, and which of

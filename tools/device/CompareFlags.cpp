@@ -1,4 +1,4 @@
-//===-- tools/device/CompareFlags.cpp - the compare flags by name ---------------===//
+//===-- tools/device/CompareFlags.cpp - the compare flags by name ---------===//
 #include "CompareFlags.h"
 
 #include "VnI/PropertyType.h"

@@ -1,4 +1,4 @@
-//===-- tools/device/DeviceModel.cpp - a device as the editor's holders and tree --===//
+//===-- tools/device/DeviceModel.cpp - a device as the editor's holders and tree ---===//
 #include "DeviceModel.h"
 
 #include "VnI/PropertyType.h"

@@ -1,4 +1,4 @@
-//===-- tools/device/DeviceModel.h - a device as the editor's holders and tree ----===//
+//===-- tools/device/DeviceModel.h - a device as the editor's holders and tree ---===//
 //
 // \file
 // One home for the device every subcommand (and the editor) works on: the chip

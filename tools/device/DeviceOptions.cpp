@@ -1,4 +1,4 @@
-//===-- tools/device/DeviceOptions.cpp - which chip database a command opens ------===//
+//===-- tools/device/DeviceOptions.cpp - which chip database a command opens ---===//
 #include "DeviceOptions.h"
 
 #include "Port/SearchPath.h"

@@ -1,4 +1,4 @@
-//===-- tools/device/DeviceOptions.h - which chip database a command opens --------===//
+//===-- tools/device/DeviceOptions.h - which chip database a command opens ---===//
 //
 // \file
 // Every subcommand that shows or plans a device takes the same three options and means

@@ -1,4 +1,4 @@
-//===-- tools/editor/Editor.cpp - the pin-planning editor's engine ----------------===//
+//===-- tools/editor/Editor.cpp - the pin-planning editor's engine --------===//
 #include "Editor.h"
 
 #include "CompareFlags.h"

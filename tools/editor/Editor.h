@@ -1,4 +1,4 @@
-//===-- tools/editor/Editor.h - the pin-planning editor's engine ------------------===//
+//===-- tools/editor/Editor.h - the pin-planning editor's engine ----------===//
 //
 // \file
 // One object holds everything a browser session edits: the design's ports as holders,

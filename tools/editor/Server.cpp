@@ -1,4 +1,4 @@
-//===-- tools/editor/Server.cpp - the editor's HTTP server on loopback -------------===//
+//===-- tools/editor/Server.cpp - the editor's HTTP server on loopback ----===//
 #include "Server.h"
 
 #include "Editor.h"

@@ -1,4 +1,4 @@
-//===-- tools/editor/Server.h - the editor's HTTP server on loopback ---------------===//
+//===-- tools/editor/Server.h - the editor's HTTP server on loopback ------===//
 //
 // \file
 // Serves the page's files and hands API requests to the Editor. It listens on 127.0.0.1

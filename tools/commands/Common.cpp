@@ -1,9 +1,10 @@
-//===-- tools/Common.cpp - what the subcommands share ---------------------------===//
+//===-- tools/commands/Common.cpp - what the subcommands share ------------===//
 #include "Commands.h"
 
 #include "Port/SafeFile.h"
 
 #include <cstdio>
+#include <filesystem>
 
 namespace VnTool {
 
@@ -48,6 +49,33 @@ int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource&
     if (!model) {
         return Refused(command, error);
     }
+    return kExitOk;
+}
+
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs) {
+    return Port::WriteFileSafely(path, text, error, inputs);
+}
+
+int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request) {
+    DeviceDrawing drawing = RenderDevice(model, request);
+    std::string error;
+    std::vector<std::string> inputs = request.inputs;
+    if (std::string scheme = DeviceModel::ColourSchemePath(); !scheme.empty()) {
+        inputs.push_back(scheme);
+    }
+    if (!WriteTextFile(request.svg, drawing.svg, error, inputs)) {
+        return Refused(command, error);
+    }
+    if (drawing.usedFallback) {
+        std::printf("Note: the colour scheme gave no colour for some roles; those are drawn "
+                    "grey (venlomer colors shows the scheme)\n");
+    }
+    std::error_code ec;
+    auto where = std::filesystem::absolute(request.svg, ec);
+    std::printf("Floorplan written to %s (%zu tiles, %d pins, %d highlighted)\n",
+                ec ? request.svg.c_str() : where.c_str(), model.Tiles().size(), drawing.pins,
+                drawing.highlighted);
     return kExitOk;
 }
 

@@ -1,7 +1,5 @@
-//===-- tools/Svg.cpp - a minimal SVG document writer ---------------------------===//
+//===-- tools/render/Svg.cpp - a minimal SVG document writer --------------===//
 #include "Svg.h"
-
-#include "Port/SafeFile.h"
 
 #include <cstdio>
 
@@ -149,11 +147,6 @@ std::string SvgWriter::Finish() const {
            "<rect class=\"background\" x=\"0\" y=\"0\" width=\"100%\" height=\"100%\" "
            "fill=\"#ffffff\"/>\n" +
            m_body + "</svg>\n";
-}
-
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
-                   const std::vector<std::string>& inputs) {
-    return Port::WriteFileSafely(path, text, error, inputs);
 }
 
 } // namespace VnTool

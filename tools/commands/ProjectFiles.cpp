@@ -1,4 +1,4 @@
-//===-- tools/ProjectFiles.cpp - venlomer project-files -------------------------===//
+//===-- tools/commands/ProjectFiles.cpp - venlomer project-files ----------===//
 //
 // Asks the host's project manager, as the editor does when it opens, for the project
 // file, the constraints file and the netlist database. Without the host, the sample host

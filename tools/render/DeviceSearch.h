@@ -1,4 +1,4 @@
-//===-- tools/DeviceSearch.h - search, select and print a device model's holders --===//
+//===-- tools/render/DeviceSearch.h - search, select and print a device model's holders ---===//
 //
 // \file
 // What floorplan and pins show share of the editor's search road: the --find and
@@ -10,7 +10,6 @@
 //===------------------------------------------------------------------------------===//
 #pragma once
 
-#include "Args.h"
 #include "DeviceModel.h"
 
 #include "CommonI/RefCountPtr.h"
@@ -23,18 +22,12 @@
 
 namespace VnTool {
 
-/// The search options: --find NAME=VALUE and --flags LIST.
-std::vector<OptionSyntax> SearchOptionSyntax();
-
 struct SearchRequest {
     bool active = false; ///< --find was given
     std::string name;
     std::string value;
     int flags = 0; ///< VnI::MATCH_* bits
 };
-
-/// Reads --find and --flags. Returns kExitOk, or kExitUsage after reporting.
-int ParseSearchArgs(const std::string& command, const ParsedArgs& args, SearchRequest& request);
 
 /// The flags as the user types them ("regexp,ignore-case"; "exact" for none).
 std::string FlagsText(int flags);
@@ -46,11 +39,11 @@ struct SearchKind {
 };
 
 /// The value to search for, typed after the first kind that declares the property, since
-/// a property only equals one of its own type. Returns kExitOk, or kExitUsage after
-/// reporting ("WHO have no property ...; they have KNOWN").
-int MakeWanted(const std::string& command, const SearchRequest& request,
-               const std::vector<SearchKind>& kinds, const std::string& who,
-               const std::string& known, CommonI::RefCountPtr<VnI::IProperty>& wanted);
+/// a property only equals one of its own type. Returns false with the reason ("WHO have
+/// no property ...; they have KNOWN", a number that is none) in `error`.
+bool MakeWanted(const SearchRequest& request, const std::vector<SearchKind>& kinds,
+                const std::string& who, const std::string& known,
+                CommonI::RefCountPtr<VnI::IProperty>& wanted, std::string& error);
 
 /// Prints "Tree: device > Bank 0 (52 pins), ..., Tiles (n)" from the model's tree.
 void PrintTree(DeviceModel& model);

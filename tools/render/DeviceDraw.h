@@ -1,4 +1,4 @@
-//===-- tools/DeviceDraw.h - a device model drawn as an SVG floorplan -------------===//
+//===-- tools/render/DeviceDraw.h - a device model drawn as an SVG floorplan ---===//
 //
 // \file
 // Tiles in their colour-scheme colour, pins in their bank's colour (or the highlight
@@ -25,7 +25,7 @@ struct PinMark {
 };
 
 struct DrawRequest {
-    std::string svg;   ///< where to write
+    std::string svg;   ///< where the command writes it
     std::string title; ///< after "Device D, package P"
     bool highlightOnly = false;
     /// By pin index (DeviceModel::Pins()); when any pin is marked the picture is a pin
@@ -35,8 +35,14 @@ struct DrawRequest {
     std::vector<std::string> inputs; ///< files the picture must never replace
 };
 
-/// Draws and writes the picture through the safe writer, then prints where it went.
-/// Returns kExitOk, or kExitRefused after reporting why it could not write.
-int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request);
+/// The picture and what went into it; writing it is the command's business.
+struct DeviceDrawing {
+    std::string svg;
+    int pins = 0;              ///< pins drawn
+    int highlighted = 0;       ///< of them, highlighted
+    bool usedFallback = false; ///< the colour scheme lacked a role and grey stood in
+};
+
+DeviceDrawing RenderDevice(DeviceModel& model, const DrawRequest& request);
 
 } // namespace VnTool

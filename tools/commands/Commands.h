@@ -1,9 +1,11 @@
-//===-- tools/Commands.h - the subcommands of venlomer --------------------------===//
+//===-- tools/commands/Commands.h - the subcommands of venlomer -----------===//
 #pragma once
 
 #include "Args.h"
+#include "DeviceDraw.h"
 #include "DeviceModel.h"
 #include "DeviceOptions.h"
+#include "DeviceSearch.h"
 
 #include <memory>
 #include <string>
@@ -43,5 +45,25 @@ std::vector<OptionSyntax> DeviceOptionSyntax();
 /// with `model` set, or the status of the usage error or refusal it has reported.
 int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
                std::unique_ptr<DeviceModel>& model);
+
+/// The search options: --find NAME=VALUE and --flags LIST.
+std::vector<OptionSyntax> SearchOptionSyntax();
+
+/// Reads --find and --flags. Returns kExitOk, or kExitUsage after reporting.
+int ParseSearchArgs(const std::string& command, const ParsedArgs& args, SearchRequest& request);
+
+/// MakeWanted, its refusal reported as bad usage. Returns kExitOk or kExitUsage.
+int MakeWantedOrUsage(const std::string& command, const SearchRequest& request,
+                      const std::vector<SearchKind>& kinds, const std::string& who,
+                      const std::string& known, CommonI::RefCountPtr<VnI::IProperty>& wanted);
+
+/// Writes `text` to `path` through the safe writer, never over one of `inputs`.
+bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
+                   const std::vector<std::string>& inputs = {});
+
+/// Draws the model, writes the picture through the safe writer (never over the colour
+/// scheme or the request's inputs), then prints where it went. Returns kExitOk, or
+/// kExitRefused after reporting why it could not write.
+int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request);
 
 } // namespace VnTool

@@ -1,4 +1,4 @@
-//===-- tools/Args.h - command-line options of the venlomer subcommands ---------===//
+//===-- tools/commands/Args.h - command-line options of the venlomer subcommands ---===//
 //
 // \file
 // Each subcommand declares its options once; parsing, the --help text and the usage

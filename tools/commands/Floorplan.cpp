@@ -1,4 +1,4 @@
-//===-- tools/Floorplan.cpp - venlomer floorplan: the editor's road on a device ---===//
+//===-- tools/commands/Floorplan.cpp - venlomer floorplan: the editor's road on a device ---===//
 //
 // Builds what the editor builds when it opens a device view (the device model), runs a
 // search, selects and highlights the matches and draws the device in the colours of the
@@ -35,7 +35,7 @@ int Run(const ParsedArgs& args) {
     }
     CommonI::RefCountPtr<VnI::IProperty> wanted;
     if (search.active) {
-        if (int status = MakeWanted(
+        if (int status = MakeWantedOrUsage(
                 kCommand, search, {{model->PinNames(), "Pins"}, {model->BankNames(), "Banks"}},
                 "pins and banks", "Name, Bank, Tile, X, Y, Block, Edge, Pins", wanted);
             status != kExitOk) {

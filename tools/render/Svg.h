@@ -1,4 +1,4 @@
-//===-- tools/Svg.h - a minimal SVG document writer -----------------------------===//
+//===-- tools/render/Svg.h - a minimal SVG document writer ----------------===//
 //
 // \file
 // Enough SVG for floorplans and swatch sheets: rectangles, circles and text, each with
@@ -42,10 +42,5 @@ private:
     double m_width;
     double m_height;
 };
-
-/// Writes text to path through the safe writer (Port/SafeFile.h): whole or not at all,
-/// never over one of `inputs`. Returns false with a reason in error when it cannot.
-bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
-                   const std::vector<std::string>& inputs = {});
 
 } // namespace VnTool

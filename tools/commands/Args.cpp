@@ -1,4 +1,4 @@
-//===-- tools/Args.cpp - command-line options of the venlomer subcommands -------===//
+//===-- tools/commands/Args.cpp - command-line options of the venlomer subcommands ---===//
 #include "Args.h"
 
 namespace VnTool {

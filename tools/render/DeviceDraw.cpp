@@ -1,18 +1,15 @@
-//===-- tools/DeviceDraw.cpp - a device model drawn as an SVG floorplan -----------===//
+//===-- tools/render/DeviceDraw.cpp - a device model drawn as an SVG floorplan ---===//
 #include "DeviceDraw.h"
 
-#include "Commands.h"
 #include "Svg.h"
 
 #include "s/ColorManager.h"
 
 #include <algorithm>
-#include <cstdio>
-#include <filesystem>
 
 namespace VnTool {
 
-int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request) {
+DeviceDrawing RenderDevice(DeviceModel& model, const DrawRequest& request) {
     const ChipDb& db = model.Db();
     DevicePalette palette;
     const double cell = 22;
@@ -128,24 +125,7 @@ int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest
     svg.Circle(legendX + 7, y + 7, 5, palette.PathColour(0), "legend", {}, "#000000", 1.5);
     svg.Text(legendX + 20, y + 11, "search match", 12);
 
-    std::string error;
-    std::vector<std::string> inputs = request.inputs;
-    if (std::string scheme = DeviceModel::ColourSchemePath(); !scheme.empty()) {
-        inputs.push_back(scheme);
-    }
-    if (!WriteTextFile(request.svg, svg.Finish(), error, inputs)) {
-        return Refused(command, error);
-    }
-    if (palette.UsedFallback()) {
-        std::printf("Note: the colour scheme gave no colour for some roles; those are drawn "
-                    "grey (venlomer colors shows the scheme)\n");
-    }
-    std::error_code ec;
-    auto where = std::filesystem::absolute(request.svg, ec);
-    std::printf("Floorplan written to %s (%zu tiles, %d pins, %d highlighted)\n",
-                ec ? request.svg.c_str() : where.c_str(), model.Tiles().size(), drawnPins,
-                drawnHighlighted);
-    return kExitOk;
+    return {svg.Finish(), drawnPins, drawnHighlighted, palette.UsedFallback()};
 }
 
 } // namespace VnTool

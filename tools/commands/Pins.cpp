@@ -1,4 +1,4 @@
-//===-- tools/Pins.cpp - venlomer pins check|assign|show: plan a design's pins ----===//
+//===-- tools/commands/Pins.cpp - venlomer pins check|assign|show: plan a design's pins ---===//
 //
 // The road from a yosys netlist to a constraint file nextpnr-ice40 accepts: the ports of
 // the design, the pins of the device model, the checks of the plan, and the file written
@@ -284,10 +284,11 @@ int RunShow(const ParsedArgs& args) {
         {model.PinNames(), "Pins"}, {model.BankNames(), "Banks"}, {ports.Names(), "Ports"}};
     CommonI::RefCountPtr<VnI::IProperty> wanted;
     if (search.active) {
-        if (int status = MakeWanted(kShow, search, kinds, "pins, banks and ports",
-                                    "Name, Bank, Tile, X, Y, Block, Edge, Pins, Direction, Bit, "
-                                    "Clock, Pin",
-                                    wanted);
+        if (int status =
+                MakeWantedOrUsage(kShow, search, kinds, "pins, banks and ports",
+                                  "Name, Bank, Tile, X, Y, Block, Edge, Pins, Direction, Bit, "
+                                  "Clock, Pin",
+                                  wanted);
             status != kExitOk) {
             return status;
         }

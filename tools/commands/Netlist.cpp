@@ -1,4 +1,4 @@
-//===-- tools/Netlist.cpp - venlomer ngc-stub, ngc-new and ngd-sample -----------===//
+//===-- tools/commands/Netlist.cpp - venlomer ngc-stub, ngc-new and ngd-sample ---===//
 //
 // The stub creation reports through the library's messages; the tool adds only what the
 // result means and leaves the reasons to them.

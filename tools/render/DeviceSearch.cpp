@@ -1,9 +1,7 @@
-//===-- tools/DeviceSearch.cpp - search, select and print a device model's holders ===//
+//===-- tools/render/DeviceSearch.cpp - search, select and print a device model's holders ---===//
 #include "DeviceSearch.h"
 
 #include "CompareFlags.h"
-
-#include "Commands.h"
 
 #include "VnI/IDeviceResource.h"
 #include "VnI/ITreeNode.h"
@@ -23,26 +21,6 @@ namespace {
 
 template <class T> using Ptr = CommonI::RefCountPtr<T>;
 
-bool ParseFlags(const std::string& list, int& flags, std::string& error) {
-    flags = 0;
-    std::size_t start = 0;
-    while (start <= list.size()) {
-        std::size_t end = list.find_first_of(",|+", start);
-        if (end == std::string::npos) {
-            end = list.size();
-        }
-        std::string word = list.substr(start, end - start);
-        const std::optional<int> bit = CompareFlagNamed(word);
-        if (!bit) {
-            error = "unknown compare flag \"" + word + "\"; use " + CompareFlagWords();
-            return false;
-        }
-        flags |= *bit;
-        start = end + 1;
-    }
-    return true;
-}
-
 int CountChildren(const Ptr<VnI::ITreeNode>& node) {
     int count = 0;
     for (auto it = node->GetChildren(); !it->IsEnd(); it->Next()) {
@@ -61,33 +39,6 @@ std::vector<std::string> ColumnNames(VnI::IPropertyNameList* names) {
 }
 
 } // namespace
-
-std::vector<OptionSyntax> SearchOptionSyntax() {
-    return {
-        {"--find", "NAME=VALUE", "search the banks and pins for a property value"},
-        {"--flags", "LIST", "compare flags of the search, comma separated"},
-    };
-}
-
-int ParseSearchArgs(const std::string& command, const ParsedArgs& args, SearchRequest& request) {
-    std::string error;
-    if (args.Has("--flags") && !ParseFlags(args.Value("--flags"), request.flags, error)) {
-        return UsageError(command, error);
-    }
-    if (args.Has("--find")) {
-        std::string find = args.Value("--find");
-        auto eq = find.find('=');
-        if (eq == std::string::npos || eq == 0) {
-            return UsageError(command, "--find wants NAME=VALUE, got \"" + find + "\"");
-        }
-        request.active = true;
-        request.name = find.substr(0, eq);
-        request.value = find.substr(eq + 1);
-    } else if (args.Has("--flags")) {
-        return UsageError(command, "--flags needs --find");
-    }
-    return kExitOk;
-}
 
 std::string FlagsText(int flags) {
     return CompareFlagsText(flags);
@@ -109,9 +60,9 @@ std::string ValueText(const Ptr<VnI::IProperty>& property) {
     }
 }
 
-int MakeWanted(const std::string& command, const SearchRequest& request,
-               const std::vector<SearchKind>& kinds, const std::string& who,
-               const std::string& known, Ptr<VnI::IProperty>& wanted) {
+bool MakeWanted(const SearchRequest& request, const std::vector<SearchKind>& kinds,
+                const std::string& who, const std::string& known, Ptr<VnI::IProperty>& wanted,
+                std::string& error) {
     Port::StringBase<char> name(request.name.c_str());
     VnI::IPropertyNameList* declaring = nullptr;
     int position = -1;
@@ -121,15 +72,16 @@ int MakeWanted(const std::string& command, const SearchRequest& request,
         }
     }
     if (declaring == nullptr) {
-        return UsageError(command,
-                          who + " have no property \"" + request.name + "\"; they have " + known);
+        error = who + " have no property \"" + request.name + "\"; they have " + known;
+        return false;
     }
     if (declaring->GetPropertyName(position)->GetType() == VnI::INT_TYPE) {
         int value = 0;
         const std::string& text = request.value;
         auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), value);
         if (ec != std::errc() || end != text.data() + text.size()) {
-            return UsageError(command, request.name + " is a whole number; got \"" + text + "\"");
+            error = request.name + " is a whole number; got \"" + text + "\"";
+            return false;
         }
         wanted =
             Ptr<VnI::IProperty>::Adopt(Vn::Eng::PropertyFactory::CreateIntProperty(value, true));
@@ -137,7 +89,7 @@ int MakeWanted(const std::string& command, const SearchRequest& request,
         wanted = Ptr<VnI::IProperty>::Adopt(
             Vn::Eng::PropertyFactory::CreateStringProperty(request.value.c_str(), true));
     }
-    return kExitOk;
+    return true;
 }
 
 // Read back through the model, as a tree view would fill itself.

@@ -1,4 +1,4 @@
-//===-- tools/Colors.cpp - venlomer colors: the colour scheme the library loaded -===//
+//===-- tools/commands/Colors.cpp - venlomer colors: the colour scheme the library loaded ---===//
 //
 // Shows the colour manager's state as the library loaded it, so that a scheme file can be
 // checked without the editor: the single colours, the tile types, and every list with its

@@ -1,4 +1,4 @@
-//===-- tools/ChipDb.h - reads the tiles and package pins of a chip database ----===//
+//===-- tools/chipdb/ChipDb.h - reads the tiles and package pins of a chip database ---===//
 //
 // \file
 // The tool draws devices described in the text chip databases of the Debian package

@@ -1,4 +1,4 @@
-//===-- tools/editor/EditCommand.cpp - venlomer edit: the editor in a browser -----===//
+//===-- tools/commands/EditCommand.cpp - venlomer edit: the editor in a browser ---===//
 //
 // Options, the recovery file's offer, signals and the autosave: everything around the
 // engine and the server that a command needs and a test does not.

@@ -1,4 +1,4 @@
-//===-- tools/ChipDb.cpp - reads the tiles and package pins of a chip database --===//
+//===-- tools/chipdb/ChipDb.cpp - reads the tiles and package pins of a chip database ---===//
 #include "ChipDb.h"
 
 #include "Port/SafeFile.h"
