@@ -6,6 +6,7 @@
 //
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
+#include "SourceLine.h"
 
 #include "Port/MsgMan.h"
 #include "Port/SafeFile.h"
@@ -15,6 +16,7 @@
 #include <cstdlib>
 #include <exception>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <unistd.h>
 #include <vector>
@@ -58,7 +60,10 @@ void ShowMessage(const Port::Message& message) {
     std::string shown;
     for (std::size_t start = 0; start <= text.size();) {
         std::size_t end = std::min(text.find('\n', start), text.size());
-        shown += (start == 0 ? "" : "\n") + Port::Printable(text.substr(start, end - start));
+        if (start != 0) {
+            shown += '\n';
+        }
+        shown += Port::Printable(text.substr(start, end - start));
         start = end + 1;
     }
     text = shown;
@@ -72,12 +77,10 @@ void ShowMessage(const Port::Message& message) {
         break;
     case Port::Severity::Debug:
         if (g_verbose) {
-            if (message.unit.empty()) {
-                std::fprintf(stderr, "[library debug] %s\n", text.c_str());
-            } else {
-                std::fprintf(stderr, "[library debug] %s:%d: %s\n", message.unit.c_str(),
-                             message.line, text.c_str());
-            }
+            std::fprintf(stderr, "[library debug] %s\n",
+                         message.unit.empty()
+                             ? text.c_str()
+                             : VnTool::AtLine(message.unit, message.line, text).c_str());
         }
         break;
     }
@@ -103,6 +106,35 @@ void FindOwnDataOrRestart(char** argv) {
     // Running on without the scheme beats not running: the output says what is missing.
 }
 
+const Command* FindCommand(const std::string& name) {
+    for (const Command* candidate : AllCommands()) {
+        if (candidate->syntax.name == name) {
+            return candidate;
+        }
+    }
+    return nullptr;
+}
+
+// The pins commands are two words: "pins check" becomes one argument at `first`. An exit
+// status when there is no second word.
+std::optional<int> JoinPinsCommand(std::vector<std::string>& args, std::size_t& first) {
+    if (args[first] != "pins") {
+        return std::nullopt;
+    }
+    if (first + 1 == args.size() || args[first + 1].empty() || args[first + 1][0] == '-') {
+        bool help =
+            first + 1 < args.size() && (args[first + 1] == "--help" || args[first + 1] == "-h");
+        std::fprintf(help ? stdout : stderr,
+                     "%susage: venlomer pins check|assign|show [options] (see venlomer pins "
+                     "COMMAND --help)\n",
+                     help ? "" : "venlomer pins: no pins command given; ");
+        return help ? VnTool::kExitOk : VnTool::kExitUsage;
+    }
+    args[first + 1].insert(0, "pins ");
+    ++first;
+    return std::nullopt;
+}
+
 } // namespace
 
 int VnTool::LibraryErrorCount() {
@@ -121,31 +153,15 @@ int main(int argc, char** argv) {
         std::fprintf(stderr, "venlomer: no command given (see venlomer --help)\n");
         return VnTool::kExitUsage;
     }
-    // The pins commands are two words: "pins check".
-    if (args[first] == "pins") {
-        if (first + 1 == args.size() || args[first + 1].empty() || args[first + 1][0] == '-') {
-            bool help =
-                first + 1 < args.size() && (args[first + 1] == "--help" || args[first + 1] == "-h");
-            std::fprintf(help ? stdout : stderr,
-                         "%susage: venlomer pins check|assign|show [options] (see venlomer pins "
-                         "COMMAND --help)\n",
-                         help ? "" : "venlomer pins: no pins command given; ");
-            return help ? VnTool::kExitOk : VnTool::kExitUsage;
-        }
-        args[first + 1] = "pins " + args[first + 1];
-        ++first;
+    if (std::optional<int> status = JoinPinsCommand(args, first)) {
+        return *status;
     }
     const std::string& name = args[first];
     if (name == "--help" || name == "-h" || name == "help") {
         PrintToolHelp();
         return VnTool::kExitOk;
     }
-    const Command* command = nullptr;
-    for (const Command* candidate : AllCommands()) {
-        if (candidate->syntax.name == name) {
-            command = candidate;
-        }
-    }
+    const Command* command = FindCommand(name);
     if (command == nullptr) {
         std::fprintf(stderr, "venlomer: unknown command %s (see venlomer --help)\n",
                      Port::Printable(name).c_str());

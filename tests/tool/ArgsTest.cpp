@@ -1,5 +1,6 @@
 //===-- tests/tool/ArgsTest.cpp - options parse in any order; outside text escaped in SVG -===//
 #include "Args.h"
+#include "PropertyText.h"
 #include "Svg.h"
 
 #include <gtest/gtest.h>
@@ -53,7 +54,7 @@ TEST(ToolSvg, TextFromOutsideIsEscaped) {
     EXPECT_EQ(VnTool::XmlEscape("\xed\xa0\x80"), bad + bad + bad); // surrogate
     EXPECT_EQ(VnTool::XmlEscape("\xef\xbf\xbe"), bad + bad + bad); // U+FFFE
     EXPECT_EQ(VnTool::XmlEscape("\xe2\x82"), bad + bad);           // cut short
-    EXPECT_EQ(VnTool::HexColor(255, 0, 16), "#ff0010");
+    EXPECT_EQ(VnTool::HexColour(255, 0, 16), "#ff0010");
 }
 
 } // namespace

@@ -1,11 +1,17 @@
 //===-- tests/tool/DeviceModelTest.cpp - the device model and its options ---------===//
 #include "DeviceModel.h"
+#include "PropertyText.h"
+
+#include "s/PropertyFactory.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <set>
+#include <utility>
 
 namespace {
 
@@ -20,9 +26,88 @@ std::unique_ptr<VnTool::DeviceModel> OpenEightK() {
     return model;
 }
 
-TEST(DeviceModel, PinsBanksAndTreeAgreeWithTheChipDatabase) {
-    auto model = OpenEightK();
-    ASSERT_TRUE(model);
+// The 8k device in ct256, read once for the cases that only look at it.
+class EightK : public ::testing::Test {
+protected:
+    static void SetUpTestSuite() { s_model = OpenEightK().release(); }
+    static void TearDownTestSuite() {
+        delete s_model;
+        s_model = nullptr;
+    }
+    void SetUp() override { ASSERT_NE(s_model, nullptr); }
+    static VnTool::DeviceModel* s_model;
+};
+VnTool::DeviceModel* EightK::s_model = nullptr;
+
+// Every pin holder stands where the chip database bonds its pin: the holder's X, Y and
+// Block properties, its resource location and its tile name agree with the file's record,
+// and its bank is the edge's (top 0, right 1, bottom 2, left 3, as the data sheets number
+// them), so a swap of X and Y or a wrong bank for an edge fails here.
+TEST_F(EightK, EveryPinHolderStandsWhereTheChipDatabaseBondsIt) {
+    const VnTool::ChipDb& db = s_model->Db();
+    ASSERT_EQ(s_model->Pins().size(), db.pins.size());
+    std::set<int> banksSeen;
+    for (VnTool::DeviceHolder* holder : s_model->Pins()) {
+        const VnTool::Pin& pin = s_model->PinOf(holder);
+        SCOPED_TRACE(pin.name);
+        EXPECT_EQ(holder->GetName().str(), pin.name);
+        EXPECT_EQ(holder->IntOf("X"), pin.x);
+        EXPECT_EQ(holder->IntOf("Y"), pin.y);
+        EXPECT_EQ(holder->IntOf("Block"), pin.pio);
+        int x = -1;
+        int y = -1;
+        holder->AsResource()->GetLocation(x, y);
+        EXPECT_EQ(std::pair(x, y), std::pair(pin.x, pin.y));
+        EXPECT_EQ(holder->AsResource()->GetTileName().str(),
+                  "IO_" + std::to_string(pin.x) + "_" + std::to_string(pin.y));
+        int edgeBank = pin.y == db.height - 1 ? 0 : pin.x == db.width - 1 ? 1 : pin.y == 0 ? 2 : 3;
+        EXPECT_EQ(holder->IntOf("Bank"), edgeBank);
+        banksSeen.insert(edgeBank);
+    }
+    EXPECT_EQ(banksSeen.size(), 4u); // the package bonds pins on every edge
+}
+
+// One I/O tile per edge: the top and bottom rows hold TB_IO sites, the left and right
+// columns LR_IO, and a tile inside is no I/O site.
+TEST_F(EightK, IoTilesTakeTheirEdgesSiteType) {
+    const VnTool::ChipDb& db = s_model->Db();
+    struct Edge {
+        int x, y;
+        const char* siteType;
+    };
+    const int midX = db.width / 2;
+    const int midY = db.height / 2;
+    const Edge edges[] = {{midX, db.height - 1, "TB_IO"},
+                          {db.width - 1, midY, "LR_IO"},
+                          {midX, 0, "TB_IO"},
+                          {0, midY, "LR_IO"}};
+    for (const Edge& edge : edges) {
+        SCOPED_TRACE(std::to_string(edge.x) + "," + std::to_string(edge.y));
+        auto tile = std::find_if(s_model->Tiles().begin(), s_model->Tiles().end(),
+                                 [&](VnTool::DeviceHolder* holder) {
+                                     int x = -1;
+                                     int y = -1;
+                                     holder->GetLocation(x, y);
+                                     return x == edge.x && y == edge.y;
+                                 });
+        ASSERT_NE(tile, s_model->Tiles().end());
+        EXPECT_EQ((*tile)->GetSiteType().str(), edge.siteType);
+        EXPECT_EQ((*tile)->GetPropertyByName("Type")->GetStringProperty().str(), "io");
+        EXPECT_EQ((*tile)->IntOf("X"), edge.x);
+        EXPECT_EQ((*tile)->IntOf("Y"), edge.y);
+    }
+    for (VnTool::DeviceHolder* tile : s_model->Tiles()) {
+        int x = -1;
+        int y = -1;
+        tile->GetLocation(x, y);
+        if (x == midX && y == midY) {
+            EXPECT_EQ(tile->GetSiteType().str().find("_IO"), std::string::npos);
+        }
+    }
+}
+
+TEST_F(EightK, PinsBanksAndTreeAgreeWithTheChipDatabase) {
+    VnTool::DeviceModel* model = s_model;
     EXPECT_EQ(model->Pins().size(), 206u);
     EXPECT_EQ(model->Tiles().size(), 34u * 34u - 4u); // every grid cell but the corners
     VnTool::DeviceHolder* pin = model->FindPin("C8");
@@ -99,6 +184,39 @@ TEST(DeviceOptions, DeviceNamesAFileOfTheFolderAndContradictionsAreRefused) {
     EXPECT_EQ(source.package, "ct256");
     EXPECT_TRUE(source.note.empty());
     unsetenv("VENLOMER_CHIPDB_DIR");
+}
+
+// What a table prints, a search accepts: the typed query reads back every value
+// PropertyText writes, so `--find Clock=yes` finds the ports the Clock column says "yes" of.
+TEST(PropertyText, ASearchValueReadsWhatTheTablesPrint) {
+    using Vn::Eng::PropertyFactory;
+    using Ptr = CommonI::RefCountPtr<VnI::IProperty>;
+    std::string error;
+    for (bool value : {true, false}) {
+        Ptr printed = Ptr::Adopt(PropertyFactory::CreateBoolProperty(value, true));
+        Ptr wanted =
+            VnTool::TypedValue(VnI::BOOL_TYPE, "Clock", VnTool::PropertyText(printed), error);
+        ASSERT_TRUE(wanted) << error;
+        EXPECT_EQ(wanted->GetType(), VnI::BOOL_TYPE);
+        EXPECT_TRUE(printed->Equals(wanted, VnI::MATCH_EXACT));
+    }
+    for (const char* yes : {"yes", "true", "1"}) {
+        EXPECT_TRUE(VnTool::TypedValue(VnI::BOOL_TYPE, "Clock", yes, error)->GetBoolProperty());
+    }
+    EXPECT_FALSE(VnTool::TypedValue(VnI::BOOL_TYPE, "Clock", "maybe", error));
+    EXPECT_EQ(error, "Clock is yes or no; got \"maybe\"");
+
+    Ptr bank = VnTool::TypedValue(VnI::INT_TYPE, "Bank", "-3", error);
+    ASSERT_TRUE(bank);
+    EXPECT_EQ(VnTool::PropertyText(bank), "-3");
+    for (const char* notWhole : {"", "3x", "1.5", "99999999999"}) {
+        EXPECT_FALSE(VnTool::TypedValue(VnI::INT_TYPE, "Bank", notWhole, error)) << notWhole;
+    }
+    EXPECT_EQ(error, "Bank is a whole number; got \"99999999999\"");
+    EXPECT_EQ(VnTool::TypedValue(VnI::STRING_TYPE, "Name", "led[0]", error)->GetType(),
+              VnI::STRING_TYPE);
+    EXPECT_EQ(VnTool::PropertyText(nullptr), "");
+    EXPECT_EQ(VnTool::HexColour(nullptr), "");
 }
 
 } // namespace

@@ -371,6 +371,35 @@ TEST_F(ToolProcess, ASearchValueThatCannotBeOfThePropertysTypeIsBadUsage) {
     }
 }
 
+// The Clock column prints "yes" and "no"; the search takes the words it prints. A small
+// netlist as yosys writes it for one flip-flop: clk reaches the flip-flop's clock.
+TEST_F(ToolProcess, PinsShowFindsTheClockPortsByTheWordTheTablePrints) {
+    std::ofstream(m_dir / "dff.json") << R"({"creator": "Yosys", "modules": {"top": {
+  "attributes": {"top": "00000000000000000000000000000001"},
+  "ports": {"clk": {"direction": "input", "bits": [2]}, "d": {"direction": "input", "bits": [3]},
+            "q": {"direction": "output", "bits": [4]}},
+  "cells": {"q_reg": {"type": "SB_DFF", "port_directions": {"C": "input", "D": "input", "Q": "output"},
+                      "connections": {"C": [2], "D": [3], "Q": [4]}}},
+  "netnames": {}}}}
+)";
+    std::ofstream(m_dir / "dff.pcf") << "set_io clk 21\nset_io d 2\n";
+    auto show = [&](const char* find) {
+        return Run({"pins", "show", "--design", "dff.json", "--pcf", "dff.pcf", "--device", "1k",
+                    "--find", find, "--svg", "dff.svg"},
+                   "VENLOMER_CHIPDB_DIR=" VENLOMER_SYSTEM_CHIPDB_DIR);
+    };
+    Result clocks = show("Clock=yes");
+    ASSERT_EQ(clocks.status, 0) << clocks.err;
+    EXPECT_TRUE(Contains(clocks.out, ": 1 match\n")) << clocks.out;
+    EXPECT_TRUE(Contains(clocks.out, "clk")) << clocks.out;
+    Result others = show("Clock=no");
+    ASSERT_EQ(others.status, 0) << others.err;
+    EXPECT_TRUE(Contains(others.out, ": 2 matches")) << others.out;
+    Result neither = show("Clock=maybe");
+    EXPECT_EQ(neither.status, 2);
+    EXPECT_TRUE(Contains(neither.err, "Clock is yes or no")) << neither.err;
+}
+
 } // namespace
 
 // ---- netlist stubs --------------------------------------------------------------------

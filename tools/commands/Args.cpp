@@ -14,6 +14,48 @@ const OptionSyntax* FindOption(const CommandSyntax& syntax, const std::string& n
     return nullptr;
 }
 
+// One option at args[i] (with its value, which may be the next argument: i moves past it)
+// into `out`.
+bool TakeOption(const CommandSyntax& syntax, const std::vector<std::string>& args, std::size_t& i,
+                ParsedArgs& out, std::string& error) {
+    const std::string& arg = args[i];
+    std::string name = arg;
+    std::string value;
+    bool inlineValue = false;
+    if (auto eq = arg.find('='); eq != std::string::npos && arg.rfind("--", 0) == 0) {
+        name = arg.substr(0, eq);
+        value = arg.substr(eq + 1);
+        inlineValue = true;
+    }
+    const OptionSyntax* option = FindOption(syntax, name);
+    if (option == nullptr) {
+        error = "unknown option " + name;
+        return false;
+    }
+    if (out.Has(name) && !option->repeat) {
+        error = "option " + name + " given twice";
+        return false;
+    }
+    if (option->value.empty()) {
+        if (inlineValue) {
+            error = "option " + name + " takes no value";
+            return false;
+        }
+        out.flags.insert(name);
+        return true;
+    }
+    if (!inlineValue) {
+        if (i + 1 >= args.size()) {
+            error = "option " + name + " needs a value (" + option->value + ")";
+            return false;
+        }
+        value = args[++i];
+    }
+    out.values[name] = value;
+    out.lists[name].push_back(value);
+    return true;
+}
+
 } // namespace
 
 bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args, ParsedArgs& out,
@@ -38,40 +80,9 @@ bool ParseArgs(const CommandSyntax& syntax, const std::vector<std::string>& args
             out.verbose = true;
             continue;
         }
-        std::string name = arg;
-        std::string value;
-        bool inlineValue = false;
-        if (auto eq = arg.find('='); eq != std::string::npos && arg.rfind("--", 0) == 0) {
-            name = arg.substr(0, eq);
-            value = arg.substr(eq + 1);
-            inlineValue = true;
-        }
-        const OptionSyntax* option = FindOption(syntax, name);
-        if (option == nullptr) {
-            error = "unknown option " + name;
+        if (!TakeOption(syntax, args, i, out, error)) {
             return false;
         }
-        if (out.Has(name) && !option->repeat) {
-            error = "option " + name + " given twice";
-            return false;
-        }
-        if (option->value.empty()) {
-            if (inlineValue) {
-                error = "option " + name + " takes no value";
-                return false;
-            }
-            out.flags.insert(name);
-            continue;
-        }
-        if (!inlineValue) {
-            if (i + 1 >= args.size()) {
-                error = "option " + name + " needs a value (" + option->value + ")";
-                return false;
-            }
-            value = args[++i];
-        }
-        out.values[name] = value;
-        out.lists[name].push_back(value);
     }
     if (out.help) {
         return true;

@@ -6,6 +6,7 @@
 //
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
+#include "PropertyText.h"
 #include "Svg.h"
 
 #include "s/ColorScheme.h"
@@ -39,7 +40,7 @@ std::string Hex(const Swatch& color) {
     if (!color.present) {
         return "(none)";
     }
-    return HexColor(color.red, color.green, color.blue) + (color.valid ? "" : " (not valid)");
+    return HexColour(color.red, color.green, color.blue) + (color.valid ? "" : " (not valid)");
 }
 
 Group List(const std::string& title, const std::vector<Swatch>& list) {
@@ -107,7 +108,7 @@ int Draw(const std::vector<Group>& groups, const std::string& path, const std::s
             // A missing colour is drawn crossed out rather than left out, so that the
             // swatches still count what the scheme lacks.
             if (color.present) {
-                svg.Rect(x, row, swatch, swatch, HexColor(color.red, color.green, color.blue),
+                svg.Rect(x, row, swatch, swatch, HexColour(color.red, color.green, color.blue),
                          "swatch", name + " " + Hex(color));
             } else {
                 svg.Rect(x, row, swatch, swatch, "none", "swatch missing", name + " (none)",

@@ -41,6 +41,10 @@ int LibraryErrorCount();
 /// --chipdb, --device and --package, as every device command declares them.
 std::vector<OptionSyntax> DeviceOptionSyntax();
 
+/// Which chip database and package the device options name (an empty --chipdb or
+/// --device is bad usage). Returns kExitOk, or the exit status after reporting why not.
+int ResolveDeviceOptions(const std::string& command, const ParsedArgs& args, DeviceSource& source);
+
 /// Resolves the device options of `args` and reads the chip database. Returns kExitOk
 /// with `model` set, or the status of the usage error or refusal it has reported.
 int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
@@ -57,7 +61,8 @@ int MakeWantedOrUsage(const std::string& command, const SearchRequest& request,
                       const std::vector<SearchKind>& kinds, const std::string& who,
                       const std::string& known, CommonI::RefCountPtr<VnI::IProperty>& wanted);
 
-/// Writes `text` to `path` through the safe writer, never over one of `inputs`.
+/// Writes `text` to `path` through the safe writer, never over one of `inputs` (the files
+/// the command read) nor the colour scheme: DeviceModel::FilesNeverReplaced.
 bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
                    const std::vector<std::string>& inputs = {});
 

@@ -28,8 +28,7 @@ std::vector<OptionSyntax> DeviceOptionSyntax() {
     };
 }
 
-int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
-               std::unique_ptr<DeviceModel>& model) {
+int ResolveDeviceOptions(const std::string& command, const ParsedArgs& args, DeviceSource& source) {
     DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
     for (const char* option : {"--chipdb", "--device"}) {
         if (args.Has(option) && args.Value(option).empty()) {
@@ -39,12 +38,21 @@ int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource&
     std::string error;
     switch (ResolveDevice(request, source, error)) {
     case DeviceResolution::Ok:
-        break;
+        return kExitOk;
     case DeviceResolution::BadUsage:
         return UsageError(command, error);
     case DeviceResolution::Missing:
-        return Refused(command, error);
+        break;
     }
+    return Refused(command, error);
+}
+
+int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource& source,
+               std::unique_ptr<DeviceModel>& model) {
+    if (int status = ResolveDeviceOptions(command, args, source); status != kExitOk) {
+        return status;
+    }
+    std::string error;
     model = DeviceModel::Open(source, error);
     if (!model) {
         return Refused(command, error);
@@ -54,17 +62,13 @@ int OpenDevice(const std::string& command, const ParsedArgs& args, DeviceSource&
 
 bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,
                    const std::vector<std::string>& inputs) {
-    return Port::WriteFileSafely(path, text, error, inputs);
+    return Port::WriteFileSafely(path, text, error, DeviceModel::FilesNeverReplaced(inputs));
 }
 
 int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request) {
     DeviceDrawing drawing = RenderDevice(model, request);
     std::string error;
-    std::vector<std::string> inputs = request.inputs;
-    if (std::string scheme = DeviceModel::ColourSchemePath(); !scheme.empty()) {
-        inputs.push_back(scheme);
-    }
-    if (!WriteTextFile(request.svg, drawing.svg, error, inputs)) {
+    if (!WriteTextFile(request.svg, drawing.svg, error, request.inputs)) {
         return Refused(command, error);
     }
     if (drawing.usedFallback) {

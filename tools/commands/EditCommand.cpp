@@ -28,28 +28,20 @@ const char kCommand[] = "edit";
 // How often unsaved work goes to the recovery file.
 constexpr auto kRecoveryInterval = std::chrono::seconds(2);
 
-int Run(const ParsedArgs& args) {
-    EditorFiles files;
+// The options that need no file opened: the device, the port, the recovery choice.
+int CheckOptions(const ParsedArgs& args, EditorFiles& files, int& port) {
     files.design = args.Value("--design");
     files.pcf = args.Value("--pcf");
     if (files.design.empty() || files.pcf.empty()) {
         return UsageError(kCommand, "--design and --pcf are required");
     }
-    std::string error;
-    DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
-    switch (ResolveDevice(request, files.device, error)) {
-    case DeviceResolution::Ok:
-        break;
-    case DeviceResolution::BadUsage:
-        return UsageError(kCommand, error);
-    case DeviceResolution::Missing:
-        return Refused(kCommand, error);
+    if (int status = ResolveDeviceOptions(kCommand, args, files.device); status != kExitOk) {
+        return status;
     }
     if (files.device.chipDb == "-") {
         return UsageError(kCommand, "the editor reads its chip database from a file, not "
                                     "standard input");
     }
-    int port = 0;
     if (args.Has("--port")) {
         std::string text = args.Value("--port");
         char* end = nullptr;
@@ -62,49 +54,43 @@ int Run(const ParsedArgs& args) {
     if (args.Has("--recover") && args.Has("--discard-recovery")) {
         return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
     }
+    return kExitOk;
+}
 
-    std::string page = FindDataFile("editor/index.html");
-    if (page.empty()) {
-        return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
-                                 "VENLOMER_DATA_PATH to the folder that holds it");
-    }
-    if (!files.device.note.empty()) {
-        std::printf("Note: %s\n", files.device.note.c_str());
-    }
-    Editor editor;
-    if (!editor.Open(files, error)) {
-        return Refused(kCommand, error);
-    }
-    if (editor.HasRecovery()) {
+// What an earlier session left unsaved: loaded, dropped, or in the way.
+int SettleRecovery(const ParsedArgs& args, Editor& editor, const EditorFiles& files) {
+    std::string error;
+    if (!editor.HasRecovery()) {
         if (args.Has("--recover")) {
-            if (!editor.LoadRecovery(error)) {
-                return Refused(kCommand, error);
-            }
-            std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
-                        editor.RecoveryPath().c_str(), files.pcf.c_str());
-        } else if (args.Has("--discard-recovery")) {
-            std::error_code ec;
-            std::filesystem::remove(editor.RecoveryPath(), ec);
-            std::printf("Dropped the unsaved changes of an earlier session (%s)\n",
+            std::printf("No unsaved changes to recover (%s does not exist)\n",
                         editor.RecoveryPath().c_str());
-        } else {
-            // Starting over it would overwrite that work with this session's.
-            return Refused(kCommand, editor.RecoveryPath() +
-                                         " holds unsaved changes of an earlier session: start "
-                                         "with --recover to load them, or --discard-recovery "
-                                         "to drop them");
         }
-    } else if (args.Has("--recover")) {
-        std::printf("No unsaved changes to recover (%s does not exist)\n",
+        return kExitOk;
+    }
+    if (args.Has("--recover")) {
+        if (!editor.LoadRecovery(error)) {
+            return Refused(kCommand, error);
+        }
+        std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
+                    editor.RecoveryPath().c_str(), files.pcf.c_str());
+        return kExitOk;
+    }
+    if (args.Has("--discard-recovery")) {
+        std::error_code ec;
+        std::filesystem::remove(editor.RecoveryPath(), ec);
+        std::printf("Dropped the unsaved changes of an earlier session (%s)\n",
                     editor.RecoveryPath().c_str());
+        return kExitOk;
     }
+    // Starting over it would overwrite that work with this session's.
+    return Refused(kCommand, editor.RecoveryPath() +
+                                 " holds unsaved changes of an earlier session: start with "
+                                 "--recover to load them, or --discard-recovery to drop them");
+}
 
-    EditorServer server(editor);
-    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
-        !server.Bind(port, error)) {
-        return Refused(kCommand, error);
-    }
-
+// Serves until SIGINT or SIGTERM, writing unsaved work to the recovery file meanwhile and
+// once more at the end.
+int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
     // Signals are taken by one thread with sigwait, so no handler runs inside the server
     // or the library; every thread started below inherits the mask.
     sigset_t stopSignals;
@@ -142,6 +128,7 @@ int Run(const ParsedArgs& args) {
     }
     wake.notify_all();
     autosave.join();
+    std::string error;
     if (!editor.WriteRecovery(error)) {
         return Refused(kCommand, "the unsaved changes were not kept: " + error);
     }
@@ -152,6 +139,36 @@ int Run(const ParsedArgs& args) {
         std::printf("Stopped; nothing unsaved\n");
     }
     return kExitOk;
+}
+
+int Run(const ParsedArgs& args) {
+    EditorFiles files;
+    int port = 0;
+    if (int status = CheckOptions(args, files, port); status != kExitOk) {
+        return status;
+    }
+    std::string page = FindDataFile("editor/index.html");
+    if (page.empty()) {
+        return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
+                                 "VENLOMER_DATA_PATH to the folder that holds it");
+    }
+    if (!files.device.note.empty()) {
+        std::printf("Note: %s\n", files.device.note.c_str());
+    }
+    Editor editor;
+    std::string error;
+    if (!editor.Open(files, error)) {
+        return Refused(kCommand, error);
+    }
+    if (int status = SettleRecovery(args, editor, files); status != kExitOk) {
+        return status;
+    }
+    EditorServer server(editor);
+    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
+        !server.Bind(port, error)) {
+        return Refused(kCommand, error);
+    }
+    return Serve(editor, server, files);
 }
 
 } // namespace

@@ -5,29 +5,23 @@
 
 namespace VnTool {
 
-namespace {
-
-struct FlagName {
-    const char* name;
-    int bit;
-};
-
-const FlagName kFlagNames[] = {
-    {"exact", VnI::MATCH_EXACT},
-    {"ignore-case", VnI::MATCH_IGNORE_CASE},
-    {"substring", VnI::MATCH_SUBSTRING},
-    {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
-    {"less", VnI::MATCH_LESS},
-    {"greater", VnI::MATCH_GREATER},
-    {"any", VnI::MATCH_ANY},
-    {"regexp", VnI::MATCH_REGEXP},
-};
-
-} // namespace
+const std::vector<CompareFlagWord>& CompareFlagTable() {
+    static const std::vector<CompareFlagWord> table = {
+        {"exact", VnI::MATCH_EXACT},
+        {"ignore-case", VnI::MATCH_IGNORE_CASE},
+        {"substring", VnI::MATCH_SUBSTRING},
+        {"within-5-percent", VnI::MATCH_WITHIN_5_PERCENT},
+        {"less", VnI::MATCH_LESS},
+        {"greater", VnI::MATCH_GREATER},
+        {"any", VnI::MATCH_ANY},
+        {"regexp", VnI::MATCH_REGEXP},
+    };
+    return table;
+}
 
 std::optional<int> CompareFlagNamed(std::string_view word) {
-    for (const auto& flag : kFlagNames) {
-        if (word == flag.name) {
+    for (const auto& flag : CompareFlagTable()) {
+        if (word == flag.word) {
             return flag.bit;
         }
     }
@@ -36,16 +30,20 @@ std::optional<int> CompareFlagNamed(std::string_view word) {
 
 std::string CompareFlagsText(int flags) {
     std::string text;
-    for (const auto& flag : kFlagNames) {
+    for (const auto& flag : CompareFlagTable()) {
         if ((flags & flag.bit) != 0) {
-            text += (text.empty() ? "" : ",") + std::string(flag.name);
+            text += (text.empty() ? "" : ",") + std::string(flag.word);
         }
     }
     return text.empty() ? "exact" : text;
 }
 
-const char* CompareFlagWords() {
-    return "exact, ignore-case, substring, within-5-percent, less, greater, any, regexp";
+std::string CompareFlagWords() {
+    std::string words;
+    for (const auto& flag : CompareFlagTable()) {
+        words += (words.empty() ? "" : ", ") + std::string(flag.word);
+    }
+    return words;
 }
 
 } // namespace VnTool

@@ -10,6 +10,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace VnTool {
 
@@ -21,6 +22,16 @@ std::optional<int> CompareFlagNamed(std::string_view word);
 std::string CompareFlagsText(int flags);
 
 /// Every word CompareFlagNamed knows, comma-separated, for messages.
-const char* CompareFlagWords();
+std::string CompareFlagWords();
+
+/// One compare flag: the word users type and the library's bit.
+struct CompareFlagWord {
+    const char* word;
+    int bit;
+};
+
+/// Every compare flag in the order help texts list them; what the editor serves its page,
+/// so the page offers exactly the words the server accepts.
+const std::vector<CompareFlagWord>& CompareFlagTable();
 
 } // namespace VnTool

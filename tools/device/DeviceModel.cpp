@@ -1,5 +1,6 @@
 //===-- tools/device/DeviceModel.cpp - a device as the editor's holders and tree ---===//
 #include "DeviceModel.h"
+#include "PropertyText.h"
 
 #include "VnI/PropertyType.h"
 #include "s/ColorManager.h"
@@ -143,7 +144,13 @@ DeviceHolder* DeviceModel::Make(DeviceHolder::Kind kind, int index,
 }
 
 void DeviceModel::BuildResources() {
-    using Kind = DeviceHolder::Kind;
+    DeclareNames();
+    BuildDeviceAndBanks();
+    BuildTiles();
+    BuildPins();
+}
+
+void DeviceModel::DeclareNames() {
     m_tileTypes = {Text("logic"), Text("io"), Text("ramb"), Text("ramt")};
     // Names are declared up front so that every kind lists its columns in this order,
     // whatever order properties arrive in.
@@ -173,7 +180,10 @@ void DeviceModel::BuildResources() {
                          {"X", number},
                          {"Y", number},
                          {"Block", number}});
+}
 
+void DeviceModel::BuildDeviceAndBanks() {
+    using Kind = DeviceHolder::Kind;
     m_device = Make(Kind::Device, 0, m_deviceNames, "", -1, -1, "DEVICE");
     AddText(m_device, "Name", m_db.device);
     AddText(m_device, "Package", m_db.package);
@@ -199,11 +209,14 @@ void DeviceModel::BuildResources() {
         m_bankByNumber[bank] = r;
         m_banks.push_back(r);
     }
+}
+
+void DeviceModel::BuildTiles() {
     int index = 0;
     for (const Tile& tile : m_db.tiles) {
         std::string name = TileName(tile.kind, tile.x, tile.y);
-        DeviceHolder* r =
-            Make(Kind::Tile, index++, m_tileNames, name, tile.x, tile.y, SiteTypeOf(tile, m_db));
+        DeviceHolder* r = Make(DeviceHolder::Kind::Tile, index++, m_tileNames, name, tile.x, tile.y,
+                               SiteTypeOf(tile, m_db));
         AddText(r, "Name", name);
         r->AddProperty("Type", Adopt(Vn::Eng::PropertyFactory::CreateEnumProperty(
                                    m_tileTypes, TileKindName(tile.kind), true)));
@@ -211,10 +224,14 @@ void DeviceModel::BuildResources() {
         AddInt(r, "Y", tile.y);
         m_tiles.push_back(r);
     }
-    index = 0;
+}
+
+void DeviceModel::BuildPins() {
+    int index = 0;
     for (const Pin& pin : m_db.pins) {
         std::string tile = TileName(TileKind::Io, pin.x, pin.y);
-        DeviceHolder* r = Make(Kind::Pin, index, m_pinNames, tile, pin.x, pin.y, "IO");
+        DeviceHolder* r =
+            Make(DeviceHolder::Kind::Pin, index, m_pinNames, tile, pin.x, pin.y, "IO");
         AddText(r, "Name", pin.name);
         AddInt(r, "Bank", pin.bank);
         AddText(r, "Tile", tile);
@@ -306,6 +323,12 @@ std::string DeviceModel::ColourSchemePath() {
     return Vn::Eng::ColorScheme::GetPath();
 }
 
+std::vector<std::string> DeviceModel::FilesNeverReplaced(std::vector<std::string> read) {
+    read.push_back(ColourSchemePath());
+    std::erase_if(read, [](const std::string& path) { return path.empty(); });
+    return read;
+}
+
 // ---- colours ---------------------------------------------------------------------------
 
 std::string DevicePalette::Of(const Ptr<VnI::IColorProperty>& colour, const char* fallback) {
@@ -313,10 +336,7 @@ std::string DevicePalette::Of(const Ptr<VnI::IColorProperty>& colour, const char
         m_usedFallback = true;
         return fallback;
     }
-    char text[8];
-    std::snprintf(text, sizeof text, "#%02x%02x%02x", colour->GetRed() & 0xff,
-                  colour->GetGreen() & 0xff, colour->GetBlue() & 0xff);
-    return text;
+    return HexColour(colour);
 }
 
 std::string DevicePalette::TileColour(const DeviceHolder& tile) {

@@ -153,9 +153,18 @@ public:
 
     /// The colour-scheme file the library read; a command must never write over it.
     static std::string ColourSchemePath();
+    /// The files a write must never replace: every file the run reads (`read`: the chip
+    /// database, the netlist, the constraint file when something else is written) and the
+    /// colour scheme; empty names are dropped. The one list every writer passes to the
+    /// safe writer.
+    static std::vector<std::string> FilesNeverReplaced(std::vector<std::string> read);
 
 private:
     void BuildResources();
+    void DeclareNames();
+    void BuildDeviceAndBanks();
+    void BuildTiles();
+    void BuildPins();
     void BuildTree();
     DeviceHolder* Make(DeviceHolder::Kind kind, int index, Vn::Eng::PropertyNameList& names,
                        std::string tileName, int x, int y, std::string siteType);

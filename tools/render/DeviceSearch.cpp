@@ -2,16 +2,15 @@
 #include "DeviceSearch.h"
 
 #include "CompareFlags.h"
+#include "PropertyText.h"
 
 #include "VnI/IDeviceResource.h"
 #include "VnI/ITreeNode.h"
 #include "VnI/PropertyType.h"
 #include "s/FindItr.h"
-#include "s/PropertyFactory.h"
 #include "s/PropertyHolderItr.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <list>
 
@@ -44,52 +43,19 @@ std::string FlagsText(int flags) {
     return CompareFlagsText(flags);
 }
 
-std::string ValueText(const Ptr<VnI::IProperty>& property) {
-    if (!property) {
-        return "";
-    }
-    switch (property->GetType()) {
-    case VnI::INT_TYPE:
-        return std::to_string(property->GetIntProperty());
-    case VnI::DOUBLE_TYPE:
-        return std::to_string(property->GetDoubleProperty());
-    case VnI::BOOL_TYPE:
-        return property->GetBoolProperty() ? "yes" : "no";
-    default:
-        return property->GetStringProperty().str();
-    }
-}
-
 bool MakeWanted(const SearchRequest& request, const std::vector<SearchKind>& kinds,
                 const std::string& who, const std::string& known, Ptr<VnI::IProperty>& wanted,
                 std::string& error) {
     Port::StringBase<char> name(request.name.c_str());
-    VnI::IPropertyNameList* declaring = nullptr;
-    int position = -1;
     for (const SearchKind& kind : kinds) {
-        if (declaring == nullptr && (position = kind.names->Contains(name)) >= 0) {
-            declaring = kind.names;
+        if (int position = kind.names->Contains(name); position >= 0) {
+            wanted = TypedValue(kind.names->GetPropertyName(position)->GetType(), request.name,
+                                request.value, error);
+            return static_cast<bool>(wanted);
         }
     }
-    if (declaring == nullptr) {
-        error = who + " have no property \"" + request.name + "\"; they have " + known;
-        return false;
-    }
-    if (declaring->GetPropertyName(position)->GetType() == VnI::INT_TYPE) {
-        int value = 0;
-        const std::string& text = request.value;
-        auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), value);
-        if (ec != std::errc() || end != text.data() + text.size()) {
-            error = request.name + " is a whole number; got \"" + text + "\"";
-            return false;
-        }
-        wanted =
-            Ptr<VnI::IProperty>::Adopt(Vn::Eng::PropertyFactory::CreateIntProperty(value, true));
-    } else {
-        wanted = Ptr<VnI::IProperty>::Adopt(
-            Vn::Eng::PropertyFactory::CreateStringProperty(request.value.c_str(), true));
-    }
-    return true;
+    error = who + " have no property \"" + request.name + "\"; they have " + known;
+    return false;
 }
 
 // Read back through the model, as a tree view would fill itself.
@@ -173,7 +139,7 @@ SearchAndPrint(const SearchRequest& request, const Ptr<VnI::IProperty>& wanted,
             std::vector<std::string> row;
             row.reserve(columns.size());
             for (const auto& column : columns) {
-                row.push_back(ValueText(match->GetPropertyByName(column.c_str())));
+                row.push_back(PropertyText(match->GetPropertyByName(column.c_str())));
             }
             rows.push_back(std::move(row));
         }

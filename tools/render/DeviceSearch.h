@@ -11,6 +11,7 @@
 #pragma once
 
 #include "DeviceModel.h"
+#include "PropertyText.h"
 
 #include "CommonI/RefCountPtr.h"
 #include "VnI/IProperty.h"
@@ -38,9 +39,9 @@ struct SearchKind {
     std::string title; ///< "Pins", "Banks", "Ports"
 };
 
-/// The value to search for, typed after the first kind that declares the property, since
-/// a property only equals one of its own type. Returns false with the reason ("WHO have
-/// no property ...; they have KNOWN", a number that is none) in `error`.
+/// The value to search for, typed (TypedValue) after the first kind that declares the
+/// property, since a property only equals one of its own type. Returns false with the reason ("WHO
+/// have no property ...; they have KNOWN", a number that is none) in `error`.
 bool MakeWanted(const SearchRequest& request, const std::vector<SearchKind>& kinds,
                 const std::string& who, const std::string& known,
                 CommonI::RefCountPtr<VnI::IProperty>& wanted, std::string& error);
@@ -63,8 +64,10 @@ void SelectAndHighlight(DeviceModel& model, const std::vector<VnI::IPropertyHold
 void SearchDevice(DeviceModel& model, const SearchRequest& request,
                   const CommonI::RefCountPtr<VnI::IProperty>& wanted);
 
-/// A property's value as the tables print it.
-std::string ValueText(const CommonI::RefCountPtr<VnI::IProperty>& property);
+/// PropertyText under the name the pins commands still call it by.
+inline std::string ValueText(const CommonI::RefCountPtr<VnI::IProperty>& property) {
+    return PropertyText(property);
+}
 
 /// Prints a table: the header row, then the rows, columns padded to their widest cell.
 void PrintTable(const std::vector<std::string>& columns,

@@ -25,16 +25,6 @@ std::string Tooltip(std::string_view title) {
     return title.empty() ? std::string() : "<title>" + XmlEscape(title) + "</title>";
 }
 
-} // namespace
-
-std::string HexColor(int red, int green, int blue) {
-    char buffer[8];
-    std::snprintf(buffer, sizeof buffer, "#%02x%02x%02x", red & 0xff, green & 0xff, blue & 0xff);
-    return buffer;
-}
-
-namespace {
-
 // The length of the well-formed UTF-8 sequence at text[i] that XML may hold, or 0: overlong
 // forms, surrogates, code points past U+10FFFF and U+FFFE/U+FFFF are not characters.
 std::size_t XmlCharLength(std::string_view text, std::size_t i) {

@@ -14,9 +14,6 @@
 
 namespace VnTool {
 
-/// An RGB colour as "#rrggbb".
-std::string HexColor(int red, int green, int blue);
-
 /// Escapes &, <, >, " and ' for use in XML text and attribute values; control characters
 /// become '?' and bytes that are not UTF-8 characters become U+FFFD.
 std::string XmlEscape(std::string_view text);

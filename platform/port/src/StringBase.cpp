@@ -102,8 +102,14 @@ void StringBase<char>::Assign(const char* text, std::size_t n) {
         return;
     }
     if (OnHeap() && n <= Capacity()) {
-        std::memmove(HeapData(), text, n);
-        SetLength(static_cast<unsigned int>(n));
+        // Still on the heap, so the length goes beside the block. Not through SetLength:
+        // after the memmove the compiler cannot tell that the text is still on the heap
+        // and would see SetLength's inline branch store past the inline bytes.
+        char* block = HeapData();
+        std::memmove(block, text, n);
+        const auto length = static_cast<unsigned int>(n);
+        std::memcpy(m_bytes + kLengthAt, &length, sizeof length);
+        block[n] = '\0';
         return;
     }
     char* block = new char[n + 1];
