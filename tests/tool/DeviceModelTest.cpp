@@ -42,8 +42,9 @@ VnTool::DeviceModel* EightK::s_model = nullptr;
 // Every pin holder stands where the chip database bonds its pin: the holder's X, Y and
 // Block properties, its resource location and its tile name agree with the file's record,
 // and its bank is the edge's (top 0, right 1, bottom 2, left 3, as the data sheets number
-// them), so a swap of X and Y or a wrong bank for an edge fails here.
-TEST_F(EightK, EveryPinHolderStandsWhereTheChipDatabaseBondsIt) {
+// them), so a swap of X and Y or a wrong bank for an edge fails here; the I/O tiles take
+// their edge's site type.
+TEST_F(EightK, PinAndIoTileHoldersStandWhereTheChipDatabasePutsThem) {
     const VnTool::ChipDb& db = s_model->Db();
     ASSERT_EQ(s_model->Pins().size(), db.pins.size());
     std::set<int> banksSeen;
@@ -65,12 +66,9 @@ TEST_F(EightK, EveryPinHolderStandsWhereTheChipDatabaseBondsIt) {
         banksSeen.insert(edgeBank);
     }
     EXPECT_EQ(banksSeen.size(), 4u); // the package bonds pins on every edge
-}
 
-// One I/O tile per edge: the top and bottom rows hold TB_IO sites, the left and right
-// columns LR_IO, and a tile inside is no I/O site.
-TEST_F(EightK, IoTilesTakeTheirEdgesSiteType) {
-    const VnTool::ChipDb& db = s_model->Db();
+    // One I/O tile per edge: the top and bottom rows hold TB_IO sites, the left and right
+    // columns LR_IO, and a tile inside is no I/O site.
     struct Edge {
         int x, y;
         const char* siteType;

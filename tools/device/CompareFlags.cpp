@@ -32,7 +32,8 @@ std::string CompareFlagsText(int flags) {
     std::string text;
     for (const auto& flag : CompareFlagTable()) {
         if ((flags & flag.bit) != 0) {
-            text += (text.empty() ? "" : ",") + std::string(flag.word);
+            text += text.empty() ? "" : ",";
+            text += flag.word;
         }
     }
     return text.empty() ? "exact" : text;
@@ -41,7 +42,8 @@ std::string CompareFlagsText(int flags) {
 std::string CompareFlagWords() {
     std::string words;
     for (const auto& flag : CompareFlagTable()) {
-        words += (words.empty() ? "" : ", ") + std::string(flag.word);
+        words += words.empty() ? "" : ", ";
+        words += flag.word;
     }
     return words;
 }
