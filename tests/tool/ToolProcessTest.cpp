@@ -225,18 +225,30 @@ TEST_F(ToolProcess, BadUsageExitsWithTwoAndOneLineOfReason) {
 
 // ---- floorplan ------------------------------------------------------------------------
 
+// Drawn without a search and with one that matches nothing: every tile and pin, none lit.
 TEST_F(ToolProcess, FloorplanOfTheBundledDeviceDrawsEveryTileAndPin) {
     Scan scan = ScanChipDb(VENLOMER_BUNDLED_CHIPDB, "");
-    Result result = Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB});
-    ASSERT_EQ(result.status, 0) << result.err;
-    EXPECT_TRUE(Contains(result.out, "Device demo (10 x 12 tiles)")) << result.out;
-    EXPECT_TRUE(Contains(result.out, "Floorplan written to " + (m_dir / "floorplan.svg").string()))
-        << result.out;
-    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
-    ASSERT_TRUE(svg.wellFormed) << svg.error;
-    EXPECT_EQ(svg.tiles, scan.tiles);
-    EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
-    EXPECT_EQ(svg.highlighted, 0);
+    for (bool search : {false, true}) {
+        std::vector<std::string> args = {"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB};
+        if (search) {
+            args.insert(args.end(), {"--find", "Name=NO-SUCH-PIN"});
+        }
+        Result result = Run(args);
+        ASSERT_EQ(result.status, 0) << result.err;
+        EXPECT_TRUE(Contains(result.out, "Device demo (10 x 12 tiles)")) << result.out;
+        EXPECT_TRUE(
+            Contains(result.out, "Floorplan written to " + (m_dir / "floorplan.svg").string()))
+            << result.out;
+        if (search) {
+            EXPECT_TRUE(Contains(result.out, ": 0 matches")) << result.out;
+            EXPECT_TRUE(Contains(result.out, "Highlighted: 0 pins")) << result.out;
+        }
+        SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
+        ASSERT_TRUE(svg.wellFormed) << svg.error;
+        EXPECT_EQ(svg.tiles, scan.tiles);
+        EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
+        EXPECT_EQ(svg.highlighted, 0);
+    }
     EXPECT_FALSE(fs::exists(m_dir / "floorplan.svg.part"));
 }
 
@@ -247,19 +259,6 @@ TEST_F(ToolProcess, FloorplanFallsBackToTheBundledDeviceWithoutThePackage) {
     EXPECT_TRUE(Contains(result.out, "bundled demo device")) << result.out;
     EXPECT_TRUE(Contains(result.out, "Device demo")) << result.out;
     EXPECT_TRUE(ParseSvg(m_dir / "fallback.svg").wellFormed);
-}
-
-TEST_F(ToolProcess, ASearchThatMatchesNothingHighlightsNothing) {
-    Scan scan = ScanChipDb(VENLOMER_BUNDLED_CHIPDB, "");
-    Result result =
-        Run({"floorplan", "--chipdb", VENLOMER_BUNDLED_CHIPDB, "--find", "Name=NO-SUCH-PIN"});
-    ASSERT_EQ(result.status, 0) << result.err;
-    EXPECT_TRUE(Contains(result.out, ": 0 matches")) << result.out;
-    EXPECT_TRUE(Contains(result.out, "Highlighted: 0 pins")) << result.out;
-    SvgCounts svg = ParseSvg(m_dir / "floorplan.svg");
-    ASSERT_TRUE(svg.wellFormed) << svg.error;
-    EXPECT_EQ(svg.pins, static_cast<int>(scan.pins.size()));
-    EXPECT_EQ(svg.highlighted, 0);
 }
 
 TEST_F(ToolProcess, ARegexpSearchHighlightsThePinsWhoseNameItMatchesFromTheStart) {
