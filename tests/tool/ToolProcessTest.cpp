@@ -210,6 +210,10 @@ TEST_F(ToolProcess, BadUsageExitsWithTwoAndOneLineOfReason) {
         {"ngd-sample"},
         {"colors", "--svg"},
         {"project-files", "--project"},
+        // An empty device name is refused alike by every command that opens a device.
+        {"floorplan", "--chipdb", ""},
+        {"edit", "--design", "top.json", "--pcf", "top.pcf", "--chipdb", ""},
+        {"edit", "--design", "top.json", "--pcf", "top.pcf", "--device", ""},
     };
     for (const auto& args : cases) {
         std::string shown;
