@@ -303,10 +303,11 @@ void DrawPerimeterFrame(Canvas& canvas) {
     const PackageLayout& layout = canvas.layout;
     canvas.svg.Rect(canvas.left, canvas.top, layout.width * canvas.pitch,
                     layout.height * canvas.pitch, "#fafafa", "body", {}, "#404040", 1.5);
-    // The moulded dot beside pin 1.
+    // The moulded dot in pin 1's corner, inside the rows of pads and the bank bars.
     const PackageSite& first = layout.sites.front();
-    const double x = first.x < layout.width / 2 ? 1.45 : layout.width - 1.45;
-    canvas.svg.Circle(canvas.X(x), canvas.Y(1.45), 0.28 * canvas.pitch, "#404040", "pin1",
+    const double depth = InnermostDepth(layout) + 1.35;
+    const double x = first.x < layout.width / 2 ? depth : layout.width - depth;
+    canvas.svg.Circle(canvas.X(x), canvas.Y(depth), 0.28 * canvas.pitch, "#404040", "pin1",
                       "pin 1 mark", "#404040", 0.5);
 }
 
