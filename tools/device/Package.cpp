@@ -16,7 +16,7 @@ namespace {
 constexpr std::string_view kSkippedByJedec = "IOQSXZ";
 
 // Every one- and two-letter row name, far beyond the largest ball grid.
-constexpr std::size_t kRowNameLimit = 26 * 27;
+constexpr std::size_t kRowNameLimit = std::size_t{26} * 27;
 
 // Footprint families whose pins run around four sides, even when the names carry a
 // letter (the dual-row no-lead packages name their rows "A" and "B").
