@@ -61,6 +61,12 @@ int MakeWantedOrUsage(const std::string& command, const SearchRequest& request,
                       const std::vector<SearchKind>& kinds, const std::string& who,
                       const std::string& known, CommonI::RefCountPtr<VnI::IProperty>& wanted);
 
+/// The view options: --view die|package and --bottom.
+std::vector<OptionSyntax> ViewOptionSyntax();
+
+/// Reads --view and --bottom into `request`. Returns kExitOk, or kExitUsage after reporting.
+int ParseViewArgs(const std::string& command, const ParsedArgs& args, DrawRequest& request);
+
 /// Writes `text` to `path` through the safe writer, never over one of `inputs` (the files
 /// the command read) nor the colour scheme: DeviceModel::FilesNeverReplaced.
 bool WriteTextFile(const std::string& path, const std::string& text, std::string& error,

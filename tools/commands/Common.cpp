@@ -1,6 +1,7 @@
 //===-- tools/commands/Common.cpp - what the subcommands share ------------===//
 #include "Commands.h"
 
+#include "PackageDraw.h"
 #include "Port/SafeFile.h"
 
 #include <cstdio>
@@ -66,8 +67,11 @@ bool WriteTextFile(const std::string& path, const std::string& text, std::string
 }
 
 int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest& request) {
-    DeviceDrawing drawing = RenderDevice(model, request);
+    DeviceDrawing drawing;
     std::string error;
+    if (!RenderView(model, request, drawing, error)) {
+        return Refused(command, error);
+    }
     if (!WriteTextFile(request.svg, drawing.svg, error, request.inputs)) {
         return Refused(command, error);
     }
@@ -77,6 +81,11 @@ int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest
     }
     std::error_code ec;
     auto where = std::filesystem::absolute(request.svg, ec);
+    if (request.view == DrawRequest::View::Package) {
+        std::printf("Package view written to %s (%s)\n", ec ? request.svg.c_str() : where.c_str(),
+                    drawing.summary.c_str());
+        return kExitOk;
+    }
     std::printf("Floorplan written to %s (%zu tiles, %d pins, %d highlighted)\n",
                 ec ? request.svg.c_str() : where.c_str(), model.Tiles().size(), drawing.pins,
                 drawing.highlighted);

@@ -23,6 +23,9 @@ int Run(const ParsedArgs& args) {
         return status;
     }
     DrawRequest draw;
+    if (int status = ParseViewArgs(kCommand, args, draw); status != kExitOk) {
+        return status;
+    }
     draw.highlightOnly = args.Has("--highlight-only");
     draw.svg = args.Value("--svg", "floorplan.svg");
     if (draw.svg.empty()) {
@@ -69,6 +72,9 @@ const Command& FloorplanCommand() {
         }
         options.push_back({"--svg", "OUT", "where to write the picture (default: floorplan.svg)"});
         options.push_back({"--highlight-only", "", "draw only the pins the search highlighted"});
+        for (OptionSyntax& option : ViewOptionSyntax()) {
+            options.push_back(option);
+        }
         return Command{
             {kCommand, "",
              "draw a device's tiles and package pins, search the pins, select and highlight",
@@ -77,6 +83,8 @@ const Command& FloorplanCommand() {
              "Bank, Edge, Pins. Compare flags: exact, ignore-case, substring, within-5-percent,\n"
              "less, greater, any, regexp (combinable, e.g. --flags regexp,ignore-case).\n"
              "A matched bank selects the pins below it in the tree.\n"
+             "--view package draws the package as the board sees it: a ball grid in rows and\n"
+             "columns, or the pins around four sides from pin 1; --bottom mirrors it.\n"
              "Without --chipdb or --device, chipdb-8k.txt is taken from\n"
              "/usr/share/fpga-icestorm/chipdb (or the folder in VENLOMER_CHIPDB_DIR), else the\n"
              "bundled demo device.\n"

@@ -267,6 +267,9 @@ int RunShow(const ParsedArgs& args) {
         return status;
     }
     DrawRequest draw;
+    if (int status = ParseViewArgs(kShow, args, draw); status != kExitOk) {
+        return status;
+    }
     draw.plan = true;
     draw.highlightOnly = args.Has("--highlight-only");
     draw.svg = args.Value("--svg", "pins.svg");
@@ -433,6 +436,9 @@ const Command& PinsShowCommand() {
         options[options.size() - 2].help = "search the banks, pins and ports for a value";
         options.push_back({"--svg", "OUT", "where to write the picture (default: pins.svg)"});
         options.push_back({"--highlight-only", "", "draw only the pins the search highlighted"});
+        for (const OptionSyntax& option : ViewOptionSyntax()) {
+            options.push_back(option);
+        }
         return Command{
             {kShow, "", "draw the device with the design's pins labelled and coloured by status",
              options, 0, 0,

@@ -25,8 +25,12 @@ struct PinMark {
 };
 
 struct DrawRequest {
-    std::string svg;   ///< where the command writes it
-    std::string title; ///< after "Device D, package P"
+    /// The die with its tiles, or the package as the board sees it.
+    enum class View { Die, Package };
+    View view = View::Die;
+    bool bottom = false; ///< the package seen from below (mirrored)
+    std::string svg;     ///< where the command writes it
+    std::string title;   ///< after "Device D, package P"
     bool highlightOnly = false;
     /// By pin index (DeviceModel::Pins()); when any pin is marked the picture is a pin
     /// plan: marked pins by status, the others free.
@@ -41,6 +45,7 @@ struct DeviceDrawing {
     int pins = 0;              ///< pins drawn
     int highlighted = 0;       ///< of them, highlighted
     bool usedFallback = false; ///< the colour scheme lacked a role and grey stood in
+    std::string summary;       ///< what the command says it wrote, for the package view
 };
 
 DeviceDrawing RenderDevice(DeviceModel& model, const DrawRequest& request);

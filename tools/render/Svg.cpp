@@ -103,6 +103,30 @@ std::string XmlEscape(std::string_view text) {
     return out;
 }
 
+double TextWidth(std::string_view text, double size) {
+    std::size_t characters = 0;
+    for (char c : text) {
+        characters += (static_cast<unsigned char>(c) & 0xc0) != 0x80 ? 1 : 0;
+    }
+    return 0.6 * size * static_cast<double>(characters);
+}
+
+std::string FitText(std::string_view text, double room, double size) {
+    if (TextWidth(text, size) <= room) {
+        return std::string(text);
+    }
+    std::string cut;
+    for (char c : text) {
+        // Whole UTF-8 characters only, and room kept for the ellipsis.
+        if ((static_cast<unsigned char>(c) & 0xc0) != 0x80 &&
+            TextWidth(cut, size) + 2 * 0.6 * size > room) {
+            break;
+        }
+        cut += c;
+    }
+    return TextWidth(cut, size) < 1.5 * 0.6 * size ? std::string() : cut + "\u2026";
+}
+
 SvgWriter::SvgWriter(double width, double height) : m_width(width), m_height(height) {}
 
 void SvgWriter::Rect(double x, double y, double w, double h, const std::string& fill,
@@ -123,9 +147,33 @@ void SvgWriter::Circle(double cx, double cy, double r, const std::string& fill,
 }
 
 void SvgWriter::Text(double x, double y, std::string_view text, double size,
-                     std::string_view anchor) {
-    m_body += "<text x=\"" + Num(x) + "\" y=\"" + Num(y) + "\" font-size=\"" + Num(size) +
-              "\" text-anchor=\"" + XmlEscape(anchor) + "\">" + XmlEscape(text) + "</text>\n";
+                     std::string_view anchor, std::string_view cssClass, double rotate,
+                     const std::string& fill) {
+    m_body += "<text";
+    if (!cssClass.empty()) {
+        m_body += " class=\"" + XmlEscape(cssClass) + "\"";
+    }
+    m_body += " x=\"" + Num(x) + "\" y=\"" + Num(y) + "\" font-size=\"" + Num(size) +
+              "\" text-anchor=\"" + XmlEscape(anchor) + "\"";
+    if (rotate != 0) {
+        m_body += " transform=\"rotate(" + Num(rotate) + " " + Num(x) + " " + Num(y) + ")\"";
+    }
+    if (fill != "#000000") {
+        m_body += " fill=\"" + fill + "\"";
+    }
+    m_body += ">" + XmlEscape(text) + "</text>\n";
+}
+
+void SvgWriter::Polygon(const std::vector<std::pair<double, double>>& points,
+                        const std::string& fill, std::string_view cssClass, std::string_view title,
+                        const std::string& stroke, double strokeWidth) {
+    std::string list;
+    for (const auto& [x, y] : points) {
+        list += (list.empty() ? "" : " ") + Num(x) + "," + Num(y);
+    }
+    m_body += "<polygon class=\"" + XmlEscape(cssClass) + "\" points=\"" + list + "\" fill=\"" +
+              fill + "\" stroke=\"" + stroke + "\" stroke-width=\"" + Num(strokeWidth) + "\">" +
+              Tooltip(title) + "</polygon>\n";
 }
 
 std::string SvgWriter::Finish() const {
