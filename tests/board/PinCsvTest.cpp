@@ -18,6 +18,9 @@ TEST(Csv, QuotesWhatNeedsQuotingAndReadsItBack) {
     ASSERT_TRUE(VnTool::ParseCsv(record + record, "t.csv", records, error)) << error;
     ASSERT_EQ(records.size(), 2u);
     EXPECT_EQ(records[1], fields);
+    // A record of one empty field is not a blank line.
+    ASSERT_TRUE(VnTool::ParseCsv(VnTool::CsvRecord({""}), "t.csv", records, error));
+    EXPECT_EQ(records, std::vector<std::vector<std::string>>{{""}});
 
     // LF line ends, a byte-order mark, blank lines, a last line without an end.
     ASSERT_TRUE(

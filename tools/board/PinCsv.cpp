@@ -72,6 +72,10 @@ std::string FieldAt(const std::vector<std::string>& record, int column) {
 } // namespace
 
 std::string CsvRecord(const std::vector<std::string>& fields) {
+    // A lone empty field written bare would read back as a blank line, which is skipped.
+    if (fields.size() == 1 && fields[0].empty()) {
+        return "\"\"\r\n";
+    }
     std::string out;
     for (std::size_t i = 0; i < fields.size(); ++i) {
         const std::string& field = fields[i];

@@ -359,14 +359,11 @@ const char kDevice[] = "Without --chipdb or --device, chipdb-8k.txt (package ct2
 const Command& PinsFromBoardCommand() {
     static const Command command{
         {kFromBoard, "", "plan pins from the board's KiCad netlist or board file",
-         PlanOptions({{"--board", "FILE",
-                       "KiCad netlist (.net, .xml) or board file (.kicad_pcb); twice to compare "
-                       "a netlist with its board file",
-                       true},
-                      {"--ref", "REF",
-                       "the FPGA's reference (default: the only part whose pins "
-                       "are the package's I/O pins)"},
-                      kPrefer}),
+         PlanOptions(
+             {{"--board", "FILE",
+               "KiCad netlist or board file (.net, .xml, .kicad_pcb); twice to compare", true},
+              {"--ref", "REF", "the FPGA's reference (default: the part with the package's pins)"},
+              kPrefer}),
          0, 0,
          std::string("Matches the nets on the FPGA's pins to the design's ports by the rules of "
                      "docs/board.md\n(sheet path, case and punctuation aside; active-low marks; "
