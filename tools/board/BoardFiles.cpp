@@ -192,13 +192,11 @@ const BoardPart* Board::Find(std::string_view ref) const {
 bool ReadBoard(std::string_view text, std::string_view source, Board& board, std::string& error) {
     board = Board();
     board.source = std::string(source);
-    std::size_t first = text.find_first_not_of(" \t\r\n");
-    // A byte-order mark before XML.
-    if (text.substr(0, 3) == "\xEF\xBB\xBF") {
-        first = text.find_first_not_of(" \t\r\n", 3);
-    }
-    if (first != std::string_view::npos && text[first] == '<') {
-        return ReadNetlistXml(text.substr(first), source, board, error);
+    // Some editors put a byte-order mark before XML.
+    std::string_view body = text.substr(text.substr(0, 3) == "\xEF\xBB\xBF" ? 3 : 0);
+    std::size_t first = body.find_first_not_of(" \t\r\n");
+    if (first != std::string_view::npos && body[first] == '<') {
+        return ReadNetlistXml(body, source, board, error);
     }
     SExpr root;
     if (!ParseSExpr(text, source, root, error)) {
