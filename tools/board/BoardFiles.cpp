@@ -125,13 +125,13 @@ void ReadFootprintTexts(const SExpr& footprint, BoardPart& part) {
     for (const SExpr& child : footprint.children) {
         const std::string& head = child.Head();
         std::string kind = child.AtomAt(1);
-        if (head == "fp_text" && kind == "reference") {
+        bool reference = (head == "fp_text" && kind == "reference") ||
+                         (head == "property" && kind == "Reference");
+        bool value =
+            (head == "fp_text" && kind == "value") || (head == "property" && kind == "Value");
+        if (reference) {
             part.ref = child.AtomAt(2);
-        } else if (head == "fp_text" && kind == "value") {
-            part.value = child.AtomAt(2);
-        } else if (head == "property" && kind == "Reference") {
-            part.ref = child.AtomAt(2);
-        } else if (head == "property" && kind == "Value") {
+        } else if (value) {
             part.value = child.AtomAt(2);
         }
     }

@@ -19,6 +19,7 @@
 #include <filesystem>
 #include <map>
 #include <set>
+#include <string_view>
 
 namespace VnTool {
 
@@ -81,6 +82,15 @@ void PrintList(const char* title, const std::vector<std::string>& items) {
     }
 }
 
+// Messages built in loops, one allocation each.
+std::string Cat(std::initializer_list<std::string_view> parts) {
+    std::string out;
+    for (std::string_view part : parts) {
+        out += part;
+    }
+    return out;
+}
+
 std::string FilePin(const PcfFile& pcf, const std::string& port) {
     for (const PcfLine& line : pcf.Lines()) {
         if (line.kind == PcfLine::Kind::SetIo && line.port == port) {
@@ -117,12 +127,12 @@ int Settle(const std::string& command, const ParsedArgs& args, BoardPlan& plan,
         }
         bool disagree = (!filePin.empty() && filePin != pin) || !holders.empty();
         if (!filePin.empty() && filePin != pin) {
-            conflicts.push_back("port " + port + ": " + plan.pcfPath + " puts it on " + filePin +
-                                ", the " + newSide + " on " + pin);
+            conflicts.push_back(Cat({"port ", port, ": ", plan.pcfPath, " puts it on ", filePin,
+                                     ", the ", newSide, " on ", pin}));
         }
         for (const std::string& holder : holders) {
-            conflicts.push_back("pin " + pin + ": " + plan.pcfPath + " gives it to " + holder +
-                                ", the " + newSide + " to " + port);
+            conflicts.push_back(Cat({"pin ", pin, ": ", plan.pcfPath, " gives it to ", holder,
+                                     ", the ", newSide, " to ", port}));
         }
         if (disagree && prefer == "file") {
             continue;
@@ -296,13 +306,13 @@ int ImportPlanTable(const ParsedArgs& args, BoardPlan& plan, const CsvTable& tab
     std::string csv = args.Value("--csv");
     for (const auto& [port, pin] : table.assignments) {
         if (ports.count(port) == 0) {
-            return Refused(kImport, csv + ": design " + plan.designPath + " has no port '" + port +
-                                        "'; " + plan.pcfPath + " left untouched");
+            return Refused(kImport, Cat({csv, ": design ", plan.designPath, " has no port '", port,
+                                         "'; ", plan.pcfPath, " left untouched"}));
         }
         if (!pin.empty() && pins.count(pin) == 0) {
-            return Refused(kImport, csv + ": pin '" + pin + "' of port " + port +
-                                        " is not an I/O pin of package " + db.package + "; " +
-                                        plan.pcfPath + " left untouched");
+            return Refused(kImport, Cat({csv, ": pin '", pin, "' of port ", port,
+                                         " is not an I/O pin of package ", db.package, "; ",
+                                         plan.pcfPath, " left untouched"}));
         }
         if (pin.empty()) {
             result.Unassign(port);
