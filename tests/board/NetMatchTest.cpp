@@ -87,13 +87,13 @@ TEST(NetMatch, AmbiguityIsReportedNotPlaced) {
               {"8", "/CLK"},
               {"5", "KEY"}}));
     EXPECT_TRUE(match.placed.empty());
+    const std::string notIo = "net KEY matches port key but is on pin 5, which is no I/O pin "
+                              "of package tq144; not placed";
     std::vector<std::string> expected = {
         "net LED0: ports led0, led[0] could all take it; none placed",
         "port uart_tx: nets /a/UART_TX, /b/uart_tx all match; not placed",
         "net /Rx_TTL|FIFO_D0: ports rx_ttl, fifo_d0 could all take it; none placed",
-        "net /CLK is on pins 7, 8 of the FPGA; port clk not placed",
-        "net KEY matches port key but is on pin 5, which is no I/O pin of package tq144; not "
-        "placed"};
+        "net /CLK is on pins 7, 8 of the FPGA; port clk not placed", notIo};
     EXPECT_EQ(match.problems, expected);
 }
 
