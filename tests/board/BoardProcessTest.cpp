@@ -209,4 +209,25 @@ TEST_F(BoardProcess, CsvOutAndBackIn) {
     EXPECT_TRUE(Contains(r.err, "has no port 'nosuch'")) << r.err;
 }
 
+TEST_F(BoardProcess, BadUsageAndForeignFilesAreRefusedInOneLine) {
+    const std::string board = DataFile("board1k-kicad5.net");
+    const std::vector<std::pair<std::string, std::vector<std::string>>> usage = {
+        {"from-board", {}},
+        {"from-board", {"--board", board, "--board", board, "--board", board}},
+        {"export", {}},
+        {"import", {}}};
+    for (const auto& [command, args] : usage) {
+        Result r = Run(command, args);
+        EXPECT_EQ(r.status, 2) << command << r.err;
+        EXPECT_EQ(VnTest::LineCount(r.err), 1) << r.err;
+    }
+    Result r = Run("from-board", {"--board", DataFile("board1k.v")});
+    EXPECT_EQ(r.status, 1);
+    EXPECT_TRUE(Contains(r.err, "board1k.v:1: expected '(' at the start of the file")) << r.err;
+    r = Run("from-board", {"--board", board, "--ref", "U7"});
+    EXPECT_EQ(r.status, 1);
+    EXPECT_TRUE(Contains(r.err, "has no part U7")) << r.err;
+    EXPECT_FALSE(fs::exists(m_pcf));
+}
+
 } // namespace
