@@ -27,9 +27,12 @@ using VnTool::Command;
 
 const std::vector<const Command*>& AllCommands() {
     static const std::vector<const Command*> commands = {
-        &VnTool::FloorplanCommand(), &VnTool::ColorsCommand(),     &VnTool::NgcStubCommand(),
-        &VnTool::NgcNewCommand(),    &VnTool::NgdSampleCommand(),  &VnTool::ProjectFilesCommand(),
-        &VnTool::PinsCheckCommand(), &VnTool::PinsAssignCommand(), &VnTool::PinsShowCommand(),
+        &VnTool::FloorplanCommand(),  &VnTool::ColorsCommand(),
+        &VnTool::NgcStubCommand(),    &VnTool::NgcNewCommand(),
+        &VnTool::NgdSampleCommand(),  &VnTool::ProjectFilesCommand(),
+        &VnTool::PinsCheckCommand(),  &VnTool::PinsAssignCommand(),
+        &VnTool::PinsShowCommand(),   &VnTool::PinsFromBoardCommand(),
+        &VnTool::PinsExportCommand(), &VnTool::PinsImportCommand(),
         &VnTool::EditCommand(),
     };
     return commands;
@@ -125,7 +128,8 @@ std::optional<int> JoinPinsCommand(std::vector<std::string>& args, std::size_t& 
         bool help =
             first + 1 < args.size() && (args[first + 1] == "--help" || args[first + 1] == "-h");
         std::fprintf(help ? stdout : stderr,
-                     "%susage: venlomer pins check|assign|show [options] (see venlomer pins "
+                     "%susage: venlomer pins check|assign|show|from-board|export|import [options] "
+                     "(see venlomer pins "
                      "COMMAND --help)\n",
                      help ? "" : "venlomer pins: no pins command given; ");
         return help ? VnTool::kExitOk : VnTool::kExitUsage;

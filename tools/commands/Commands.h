@@ -27,6 +27,9 @@ const Command& ProjectFilesCommand();
 const Command& PinsCheckCommand();
 const Command& PinsAssignCommand();
 const Command& PinsShowCommand();
+const Command& PinsFromBoardCommand();
+const Command& PinsExportCommand();
+const Command& PinsImportCommand();
 const Command& EditCommand();
 
 /// Prints "venlomer CMD: WHY (see venlomer CMD --help)" on stderr; returns kExitUsage.
