@@ -1,5 +1,6 @@
 //===-- tools/chipdb/ChipDb.cpp - reads the tiles and package pins of a chip database ---===//
 #include "ChipDb.h"
+#include "Suggest.h"
 
 #include "Port/SafeFile.h"
 
@@ -136,6 +137,14 @@ public:
         }
         if (!m_wanted.empty() && m_db.package.empty()) {
             error = std::string(m_source) + ": no package \"" + std::string(m_wanted) + "\"";
+            // "tq144" on the 8k file is most likely the 4k parts' "tq144:4k".
+            std::string hint = DidYouMean(m_wanted, m_db.packages);
+            for (const std::string& package : m_db.packages) {
+                if (package.rfind(std::string(m_wanted) + ":", 0) == 0) {
+                    hint = " (did you mean " + package + "?)";
+                }
+            }
+            error += hint;
             error += m_db.packages.empty() ? "; the file has no .pins section"
                                            : "; the file has: " + Join(m_db.packages);
             return false;
