@@ -88,6 +88,61 @@ bool AlongTheEdge(const Pin* a, const Pin* b) {
     return a->pio < b->pio;
 }
 
+// The pads the device's hard blocks take in the package read.
+struct HardPads {
+    std::vector<const Pin*> pllInputs;                         // of the PLLs bonded out
+    std::unordered_map<const Pin*, const Pin*> pllSecond;      // PLLOUT_A pin -> PLLOUT_B pin
+    std::vector<const Pin*> led = {nullptr, nullptr, nullptr}; // RGB0..RGB2
+};
+
+HardPads FindHardPads(const ChipDb& db) {
+    HardPads pads;
+    std::unordered_map<int, const Pin*> inputOfPll;
+    for (const HardBlockPad& pad : db.hardBlockPads) {
+        const Pin* pin = PinOfPad(db, pad);
+        if (pin == nullptr) {
+            continue;
+        }
+        if (pad.role == HardBlockPad::Role::LedDriver && pad.block >= 0 && pad.block < 3) {
+            pads.led[static_cast<std::size_t>(pad.block)] = pin;
+        } else if (pad.role == HardBlockPad::Role::PllInput && !pad.lockedInPackage) {
+            pads.pllInputs.push_back(pin);
+            inputOfPll[pad.block] = pin;
+        }
+    }
+    for (const HardBlockPad& pad : db.hardBlockPads) {
+        auto input = inputOfPll.find(pad.block);
+        if (pad.role == HardBlockPad::Role::PllSecondOut && input != inputOfPll.end()) {
+            pads.pllSecond[input->second] = PinOfPad(db, pad);
+        }
+    }
+    return pads;
+}
+
+// The low-power and high-performance parts take differential inputs in bank 3 only; the
+// UltraPlus parts anywhere.
+bool DifferentialOnlyInBankThree(const ChipDb& db) {
+    return db.device == "384" || db.device == "1k" || db.device == "8k";
+}
+
+// The other IO block of the pin's tile: a differential pair's second pin, when bonded.
+const Pin* PartnerOf(const ChipDb& db, const Pin& pin) {
+    for (const Pin& other : db.pins) {
+        if (other.x == pin.x && other.y == pin.y && other.pio != pin.pio) {
+            return &other;
+        }
+    }
+    return nullptr;
+}
+
+std::string Names(const std::vector<const Pin*>& pins) {
+    std::string names;
+    for (const Pin* pin : pins) {
+        names += (names.empty() ? "" : ", ") + pin->name;
+    }
+    return names.empty() ? "none in this package" : names;
+}
+
 std::string GlobalBufferPinNames(const ChipDb& db) {
     std::string names;
     for (const Pin* pin : PinsInOrder(db)) {
@@ -141,6 +196,7 @@ public:
                 SetIo(line, summary);
             }
         }
+        PadRules();
         Unconstrained();
         std::stable_partition(m_problems.begin(), m_problems.end(), [](const PinProblem& p) {
             return p.severity == PinProblem::Severity::Error;
@@ -150,6 +206,11 @@ public:
 
 private:
     using Severity = PinProblem::Severity;
+    struct Placed {
+        const PcfLine* line;
+        const DesignPort* port;
+        const Pin* pin;
+    };
 
     void Command(const PcfLine& line) {
         bool known = std::any_of(std::begin(kKnownCommands), std::end(kKnownCommands),
@@ -194,6 +255,9 @@ private:
         }
         if (judged) {
             Twice(line, where);
+        }
+        if (present && pin != m_pins.end() && m_lineOfPort.at(line.port) == &line) {
+            m_placed.push_back({&line, port->second, pin->second});
         }
         if (present && port->second->clock && pin != m_pins.end() &&
             !IsGlobalBufferPin(m_db, *pin->second)) {
@@ -241,6 +305,111 @@ private:
                 "pin " + line.pin + " already holds port '" + holder->second->port + "' (line " +
                     std::to_string(holder->second->number) + ")");
         }
+    }
+
+    // Where the design's hard blocks put their pads: each port's own rule, then the pads
+    // those blocks take away from every other port.
+    void PadRules() {
+        const HardPads pads = FindHardPads(m_db);
+        std::unordered_map<const Pin*, const Placed*> onPin;
+        std::unordered_map<const Pin*, std::string> heldBy;
+        for (const Placed& placed : m_placed) {
+            onPin.emplace(placed.pin, &placed);
+            if (placed.port->padUse == PadUse::PllInput && m_design.twoOutputPlls > 0) {
+                auto second = pads.pllSecond.find(placed.pin);
+                if (second != pads.pllSecond.end() && second->second != nullptr) {
+                    heldBy.emplace(second->second, "the second output of " + placed.port->padCell);
+                }
+            }
+        }
+        for (std::size_t i = 0; m_design.ledDriver && i < pads.led.size(); ++i) {
+            if (pads.led[i] != nullptr) {
+                heldBy.emplace(pads.led[i],
+                               "output RGB" + std::to_string(i) + " of the LED driver");
+            }
+        }
+        for (const Placed& placed : m_placed) {
+            std::string why = OwnRule(placed, pads, onPin);
+            auto held = heldBy.find(placed.pin);
+            if (why.empty() && placed.port->padUse != PadUse::LedDriver && held != heldBy.end()) {
+                why = "pin " + placed.pin->name + " is the pad of " + held->second +
+                      ", which the design uses; put '" + placed.port->name + "' elsewhere";
+            }
+            if (!why.empty()) {
+                Add(m_problems, Severity::Error, Where(m_pcf, *placed.line), placed.port->name,
+                    placed.pin->name, why);
+            }
+        }
+    }
+
+    std::string OwnRule(const Placed& placed, const HardPads& pads,
+                        const std::unordered_map<const Pin*, const Placed*>& onPin) const {
+        const DesignPort& port = *placed.port;
+        const Pin& pin = *placed.pin;
+        const std::string who = "port '" + port.name + "'";
+        switch (port.padUse) {
+        case PadUse::PllInput:
+            if (std::find(pads.pllInputs.begin(), pads.pllInputs.end(), &pin) ==
+                pads.pllInputs.end()) {
+                return who + " feeds " + port.padCell + " through its pad, so it must be on a " +
+                       "PLL's pad: " + Names(pads.pllInputs);
+            }
+            return {};
+        case PadUse::LedDriver: {
+            const Pin* fixed = pads.led[static_cast<std::size_t>(std::clamp(port.padIndex, 0, 2))];
+            if (fixed != &pin) {
+                return who + " is output RGB" + std::to_string(port.padIndex) +
+                       " of the LED driver, whose pad is fixed: " +
+                       (fixed != nullptr ? "pin " + fixed->name : std::string("none here")) +
+                       " (nextpnr-ice40 puts it there whatever the line says)";
+            }
+            return {};
+        }
+        case PadUse::GlobalBuffer:
+            if (!IsGlobalBufferPin(m_db, pin)) {
+                return who + " is an SB_GB_IO, whose pad must drive a global buffer: " +
+                       GlobalBufferPinNames(m_db);
+            }
+            return {};
+        case PadUse::Differential:
+            return DifferentialRule(placed, onPin);
+        case PadUse::Plain:
+            return {};
+        }
+        return {};
+    }
+
+    std::string DifferentialRule(const Placed& placed,
+                                 const std::unordered_map<const Pin*, const Placed*>& onPin) const {
+        const Pin& pin = *placed.pin;
+        const std::string who = "differential input '" + placed.port->name + "'";
+        std::string right = DifferentialPinNames();
+        if (DifferentialOnlyInBankThree(m_db) && pin.bank != 3) {
+            return who + " must be in bank 3 on this part (pin " + pin.name + " is in bank " +
+                   std::to_string(pin.bank) + "): " + right;
+        }
+        const Pin* partner = PartnerOf(m_db, pin);
+        if (pin.pio != 0 || partner == nullptr) {
+            return who + " must be on the first pin of a pair whose second pin is bonded: " + right;
+        }
+        auto other = onPin.find(partner);
+        if (other != onPin.end()) {
+            return who + " takes its pair's second pin " + partner->name + ", which holds port '" +
+                   other->second->port->name + "' (line " +
+                   std::to_string(other->second->line->number) + ")";
+        }
+        return {};
+    }
+
+    std::string DifferentialPinNames() const {
+        std::vector<const Pin*> pins;
+        for (const Pin* pin : PinsInOrder(m_db)) {
+            if (pin->pio == 0 && PartnerOf(m_db, *pin) != nullptr &&
+                (!DifferentialOnlyInBankThree(m_db) || pin->bank == 3)) {
+                pins.push_back(pin);
+            }
+        }
+        return Names(pins);
     }
 
     // "led[8]" of an eight-bit led: the index is what is wrong, and the hint says so.
@@ -332,6 +501,7 @@ private:
     std::vector<std::string> m_portNames;
     std::size_t m_portHints = 0;
     std::unordered_map<std::string, std::pair<int, int>> m_bits;
+    std::vector<Placed> m_placed; // the present ports' first lines, with a pin of the package
 };
 
 } // namespace
@@ -355,6 +525,79 @@ std::vector<PinProblem> CheckPins(const ChipDb& db, const Design& design,
     options.allowUnconstrained = !strict;
     return CheckPins(db, design, designSource, pcf, options);
 }
+
+namespace {
+
+// The ports whose pad a hard block decides go first, each to the one pad that is right for
+// it; then the pads those blocks take are kept from every other port.
+template <class Give>
+void PlaceHardBlockPorts(const ChipDb& db, const Design& design, const PcfFile& pcf,
+                         const std::vector<const DesignPort*>& open,
+                         const std::set<std::string>& taken, std::set<const Pin*>& used,
+                         Give give) {
+    const HardPads pads = FindHardPads(db);
+    auto isFree = [&](const Pin* pin) {
+        return pin != nullptr && taken.count(pin->name) == 0 && used.count(pin) == 0;
+    };
+    auto holdSecond = [&](const Pin* input) {
+        auto second = pads.pllSecond.find(input);
+        if (design.twoOutputPlls > 0 && second != pads.pllSecond.end() && second->second) {
+            used.insert(second->second);
+        }
+    };
+    std::unordered_map<std::string, const DesignPort*> portOf;
+    for (const DesignPort& port : design.ports) {
+        portOf.emplace(port.name, &port);
+    }
+    for (const PcfLine& line : pcf.Lines()) {
+        auto port = portOf.find(line.port);
+        if (line.kind == PcfLine::Kind::SetIo && port != portOf.end() &&
+            port->second->padUse == PadUse::PllInput) {
+            for (const Pin* pin : pads.pllInputs) {
+                if (pin->name == line.pin) {
+                    holdSecond(pin);
+                }
+            }
+        }
+    }
+    for (const DesignPort* port : open) {
+        if (port->padUse == PadUse::LedDriver && port->padIndex >= 0 && port->padIndex < 3) {
+            const Pin* pin = pads.led[static_cast<std::size_t>(port->padIndex)];
+            if (isFree(pin)) {
+                give(*port, pin);
+            }
+        } else if (port->padUse == PadUse::PllInput) {
+            for (const Pin* pin : pads.pllInputs) {
+                if (isFree(pin)) {
+                    give(*port, pin);
+                    holdSecond(pin);
+                    break;
+                }
+            }
+        }
+    }
+    for (const Pin* pin : pads.led) {
+        if (design.ledDriver && pin != nullptr) {
+            used.insert(pin);
+        }
+    }
+    for (const DesignPort* port : open) {
+        if (port->padUse != PadUse::Differential) {
+            continue;
+        }
+        for (const Pin* pin : PinsInOrder(db)) {
+            const Pin* partner = PartnerOf(db, *pin);
+            if (pin->pio == 0 && isFree(pin) && isFree(partner) &&
+                (!DifferentialOnlyInBankThree(db) || pin->bank == 3)) {
+                give(*port, pin);
+                used.insert(partner);
+                break;
+            }
+        }
+    }
+}
+
+} // namespace
 
 std::vector<std::pair<std::string, std::string>> AutoAssign(const ChipDb& db, const Design& design,
                                                             PcfFile& pcf) {
@@ -424,8 +667,10 @@ std::vector<std::pair<std::string, std::string>> AutoAssign(const ChipDb& db, co
             open.push_back(&port);
         }
     }
+    PlaceHardBlockPorts(db, design, pcf, open, taken, used, give);
     for (const DesignPort* port : open) {
-        if (port->clock) {
+        if ((port->clock || port->padUse == PadUse::GlobalBuffer) &&
+            placed.count(port->name) == 0) {
             if (const Pin* pin = firstFree(global)) {
                 give(*port, pin);
             }
