@@ -102,8 +102,8 @@ Features FeaturesOf(const VnTool::ChipDb& db, const Part& part) {
 
 // The netlist of the features, made once per build tree under a name of this process
 // and then renamed, so that test processes running side by side never read half of one.
-std::string Netlist(const Features& f, std::string& why) {
-    fs::path json = fs::path(VENLOMER_DESIGN_CACHE) / (f.Tag() + ".json");
+std::string Netlist(const Features& f, std::string& why, const std::string& format = "json") {
+    fs::path json = fs::path(VENLOMER_DESIGN_CACHE) / (f.Tag() + "." + format);
     fs::path verilog = fs::path(VENLOMER_DESIGN_DATA) / "parts.v";
     std::error_code ec;
     if (fs::exists(json, ec) && fs::last_write_time(json, ec) >= fs::last_write_time(verilog, ec)) {
@@ -112,7 +112,7 @@ std::string Netlist(const Features& f, std::string& why) {
     fs::create_directories(VENLOMER_DESIGN_CACHE, ec);
     std::string partial = json.string() + ".part" + std::to_string(static_cast<long>(::getpid()));
     std::string command = "yosys -q -p 'read_verilog" + f.Defines() + " " + verilog.string() +
-                          "; synth_ice40 -top top -json " + partial + "'";
+                          "; synth_ice40 -top top -" + format + " " + partial + "'";
     if (Shell(command, partial + ".log") != 0) {
         why = command + " failed: " + ReadAll(partial + ".log");
         return "";
@@ -200,6 +200,107 @@ TEST_P(EveryPart, AnAutoPlanOfEachPackageIsPlacedPinForPinAndPacked) {
     EXPECT_EQ(seen.pll, std::string(part.chipdb) != "384");
     EXPECT_TRUE(seen.lvds);
     EXPECT_EQ(seen.led, std::string(part.chipdb) == "5k");
+    std::error_code ec;
+    fs::remove_all(dir, ec);
+}
+
+// Plans that break a hard block's rule, each refused by the check at its line; nextpnr or
+// arachne-pnr refuses it too, or (for the LED driver) shows that it ignored the line.
+TEST(HardBlockRules, PlansThatBreakThemAreRefusedAndSoAreTheyByAReferee) {
+    for (const char* program : {"yosys", "nextpnr-ice40", "arachne-pnr"}) {
+        ASSERT_EQ(std::system((std::string("command -v ") + program + " >/dev/null").c_str()), 0)
+            << program << " missing: install it with scripts/bootstrap";
+    }
+    fs::path dir = fs::temp_directory_path() /
+                   ("venlomer-rules-" + std::to_string(static_cast<long>(::getpid())));
+    fs::create_directories(dir);
+    struct Case {
+        const char* tag;
+        const char* part;
+        const char* chipdb;
+        const char* package;
+        Features features;
+        const char* from; // a line of the automatic plan
+        const char* to;   // the mistake put in its place
+        const char* ours;
+        const char* referee; // "nextpnr" or "arachne"
+        const char* theirs;
+    };
+    const Case cases[] = {
+        {"pll-pad",
+         "up5k",
+         "5k",
+         "sg48",
+         {true, false, false},
+         "set_io pll_ref 35",
+         "set_io pll_ref 2",
+         "feeds SB_PLL40_PAD through its pad",
+         "nextpnr",
+         "is not connected to any PLL BEL"},
+        {"led-pad",
+         "up5k",
+         "5k",
+         "sg48",
+         {false, false, true},
+         "set_io led_g 40",
+         "set_io led_g 2",
+         "of the LED driver, whose pad is fixed: pin 40",
+         "nextpnr",
+         "led_g use by SB_RGBA_DRV/SB_RGB_DRV rgb, not creating SB_IO"},
+        {"lvds-bank",
+         "hx1k",
+         "1k",
+         "tq144",
+         {false, true, false},
+         "set_io lvds_in 2",
+         "set_io lvds_in 101",
+         "must be in bank 3 on this part",
+         "arachne",
+         "LVDS port `lvds_in' not in bank 3"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.tag);
+        VnTool::ChipDb db;
+        std::string error;
+        ASSERT_TRUE(VnTool::ReadChipDbFile(std::string(VENLOMER_SYSTEM_CHIPDB_DIR) + "/chipdb-" +
+                                               c.chipdb + ".txt",
+                                           c.package, db, error))
+            << error;
+        std::string json = Netlist(c.features, error);
+        ASSERT_FALSE(json.empty()) << error;
+        VnTool::Design design;
+        ASSERT_TRUE(VnTool::ReadYosysPortsFile(json, design, error)) << error;
+        VnTool::PcfFile plan;
+        VnTool::AutoAssign(db, design, plan);
+        std::string text = plan.Text();
+        ASSERT_NE(text.find(std::string(c.from) + "\n"), std::string::npos) << text;
+        text.replace(text.find(c.from), std::string(c.from).size(), c.to);
+        VnTool::PcfFile wrong;
+        ASSERT_TRUE(wrong.Parse(text, "wrong.pcf", error)) << error;
+        auto problems = VnTool::CheckPins(db, design, json, wrong, VnTool::CheckOptions{});
+        ASSERT_TRUE(VnTool::HasErrors(problems)) << text;
+        EXPECT_NE(problems[0].message.find(c.ours), std::string::npos) << problems[0].message;
+        EXPECT_EQ(problems[0].message.rfind("wrong.pcf:", 0), 0u) << problems[0].message;
+
+        fs::path pcf = dir / (std::string(c.tag) + ".pcf");
+        std::ofstream(pcf) << text;
+        fs::path log = dir / (std::string(c.tag) + ".log");
+        if (std::string(c.referee) == "arachne") {
+            std::string blif = Netlist(c.features, error, "blif");
+            ASSERT_FALSE(blif.empty()) << error;
+            EXPECT_NE(Shell(std::string("arachne-pnr -d ") + c.chipdb + " -P " + c.package +
+                                " -p '" + pcf.string() + "' -o '" + (dir / "a.asc").string() +
+                                "' '" + blif + "'",
+                            log),
+                      0);
+        } else {
+            Shell(std::string("nextpnr-ice40 --") + c.part + " --package " + c.package +
+                      " --placer heap --json '" + json + "' --pcf '" + pcf.string() + "' --asc '" +
+                      (dir / "n.asc").string() + "'",
+                  log);
+        }
+        EXPECT_NE(ReadAll(log).find(c.theirs), std::string::npos) << ReadAll(log);
+    }
     std::error_code ec;
     fs::remove_all(dir, ec);
 }
