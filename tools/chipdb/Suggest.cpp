@@ -6,10 +6,7 @@
 
 namespace VnTool {
 
-namespace {
-
-// Case and the spelling of a bit index do not count: "D_1", "d.1" and "d[1]" are one name.
-std::string Normal(std::string_view word) {
+std::string FoldedName(std::string_view word) {
     std::string normal;
     for (char c : word) {
         if (c == ']') {
@@ -21,6 +18,8 @@ std::string Normal(std::string_view word) {
     }
     return normal;
 }
+
+namespace {
 
 // Edit distance with swaps of neighbours, given up once it exceeds `limit`.
 std::size_t Distance(std::string_view a, std::string_view b, std::size_t limit) {
@@ -62,12 +61,12 @@ std::string ClosestName(std::string_view word, const std::vector<std::string>& c
                     [](char c) { return std::isdigit(static_cast<unsigned char>(c)) != 0; })) {
         return {};
     }
-    const std::string normal = Normal(word);
+    const std::string normal = FoldedName(word);
     const std::size_t limit = std::max<std::size_t>(1, word.size() / 3);
     std::string best;
     std::size_t bestDistance = limit + 1;
     for (const std::string& candidate : candidates) {
-        std::size_t d = Distance(normal, Normal(candidate), limit);
+        std::size_t d = Distance(normal, FoldedName(candidate), limit);
         if (d < bestDistance && candidate != word) {
             best = candidate;
             bestDistance = d;

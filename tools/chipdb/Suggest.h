@@ -20,6 +20,10 @@ namespace VnTool {
 /// Empty when none is.
 std::string ClosestName(std::string_view word, const std::vector<std::string>& candidates);
 
+/// `word` as names are compared: case folded, and a bit index written "[1]", "_1", ".1"
+/// or "-1" alike.
+std::string FoldedName(std::string_view word);
+
 /// " (did you mean NAME?)" for ClosestName, or empty: ready to append to a message.
 std::string DidYouMean(std::string_view word, const std::vector<std::string>& candidates);
 

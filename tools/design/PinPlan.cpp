@@ -7,6 +7,7 @@
 #include <map>
 #include <set>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace VnTool {
 
@@ -437,6 +438,9 @@ private:
     }
 
     void Unconstrained() {
+        for (const DesignPort& port : m_design.ports) {
+            m_foldedPorts.emplace(FoldedName(port.name), port.name);
+        }
         // A hint compares the port with every absent line: worth it for the first few.
         std::size_t hints = 0;
         for (const DesignPort& port : m_design.ports) {
@@ -447,7 +451,10 @@ private:
             if (hints < 20) {
                 ++hints;
                 std::string near = ClosestName(port.name, m_absentNames);
-                if (!near.empty()) {
+                // "LED[0]" beside the design's "led[0]" is the board's other name for
+                // another port, not a slip for "led[2]"; "d_1" is one for "d[1]" itself.
+                auto other = m_foldedPorts.find(FoldedName(near));
+                if (!near.empty() && (other == m_foldedPorts.end() || other->second == port.name)) {
                     text += " (" + Where(m_pcf, *m_absentLine.at(near)) + " names '" + near +
                             "': did you mean '" + port.name + "'?)";
                 }
@@ -501,6 +508,7 @@ private:
     std::vector<std::string> m_portNames;
     std::size_t m_portHints = 0;
     std::unordered_map<std::string, std::pair<int, int>> m_bits;
+    std::unordered_map<std::string, std::string> m_foldedPorts; // folded name -> port
     std::vector<Placed> m_placed; // the present ports' first lines, with a pin of the package
 };
 
