@@ -13,6 +13,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
@@ -456,6 +457,14 @@ TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
     double small = timed(5000);
     double large = timed(40000);
     EXPECT_LT(large, 8 * small + 0.5) << small << " s for 5000 bits, " << large << " s for 40000";
+
+    // More ports than pins: refused before any is placed, the file untouched.
+    Snapshot before = Take(m_dir / "wide.pcf");
+    Result full =
+        Pins("assign", (m_dir / "wide.pcf").string(), {"--auto"}, (m_dir / "wide.json").string());
+    EXPECT_EQ(full.status, 1);
+    EXPECT_TRUE(Contains(full.err, "40000 ports without a pin but only 95 free pins")) << full.err;
+    ExpectUntouched(m_dir / "wide.pcf", before, "more ports than pins");
 }
 
 // ---- the judge ------------------------------------------------------------------------

@@ -50,29 +50,42 @@ std::size_t Distance(std::string_view a, std::string_view b, std::size_t limit) 
 
 } // namespace
 
-std::string ClosestName(std::string_view word, const std::vector<std::string>& candidates) {
+long ClosestFoldedIndex(std::string_view word, const std::vector<std::string>& folded) {
     // Names are short; a long word compared with many names would cost more than a hint
     // is worth.
     if (word.empty() || word.size() > 64) {
-        return {};
+        return -1;
     }
     // Pin numbers are all alike: "99" is as near "9" as it is "98", so no hint helps.
     if (std::all_of(word.begin(), word.end(),
                     [](char c) { return std::isdigit(static_cast<unsigned char>(c)) != 0; })) {
-        return {};
+        return -1;
     }
     const std::string normal = FoldedName(word);
     const std::size_t limit = std::max<std::size_t>(1, word.size() / 3);
-    std::string best;
+    long best = -1;
     std::size_t bestDistance = limit + 1;
-    for (const std::string& candidate : candidates) {
-        std::size_t d = Distance(normal, FoldedName(candidate), limit);
-        if (d < bestDistance && candidate != word) {
-            best = candidate;
+    for (std::size_t i = 0; i < folded.size(); ++i) {
+        std::size_t d = Distance(normal, folded[i], limit);
+        if (d < bestDistance) {
+            best = static_cast<long>(i);
             bestDistance = d;
         }
     }
     return best;
+}
+
+std::string ClosestName(std::string_view word, const std::vector<std::string>& candidates) {
+    std::vector<std::string> folded;
+    std::vector<std::string> others;
+    for (const std::string& candidate : candidates) {
+        if (candidate != word) {
+            folded.push_back(FoldedName(candidate));
+            others.push_back(candidate);
+        }
+    }
+    long best = ClosestFoldedIndex(word, folded);
+    return best < 0 ? std::string() : others[static_cast<std::size_t>(best)];
 }
 
 std::string DidYouMean(std::string_view word, const std::vector<std::string>& candidates) {

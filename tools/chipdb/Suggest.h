@@ -20,6 +20,10 @@ namespace VnTool {
 /// Empty when none is.
 std::string ClosestName(std::string_view word, const std::vector<std::string>& candidates);
 
+/// The index in `folded` (names already passed through FoldedName) of the one closest to
+/// `word` as ClosestName judges it, or -1. For many words against one long list.
+long ClosestFoldedIndex(std::string_view word, const std::vector<std::string>& folded);
+
 /// `word` as names are compared: case folded, and a bit index written "[1]", "_1", ".1"
 /// or "-1" alike.
 std::string FoldedName(std::string_view word);

@@ -305,7 +305,10 @@ void PcfFile::AppendAll(const std::vector<std::pair<std::string, std::string>>& 
         line.command = "set_io";
         line.port = port;
         line.pin = pin;
-        line.text = "set_io " + port + " " + pin;
+        line.text = "set_io ";
+        line.text += port;
+        line.text += ' ';
+        line.text += pin;
         line.pinAt = line.text.size() - pin.size();
         line.end = end;
         m_lines.push_back(std::move(line));

@@ -441,6 +441,10 @@ private:
         for (const DesignPort& port : m_design.ports) {
             m_foldedPorts.emplace(FoldedName(port.name), port.name);
         }
+        std::vector<std::string> foldedAbsent;
+        for (const std::string& name : m_absentNames) {
+            foldedAbsent.push_back(FoldedName(name));
+        }
         // A hint compares the port with every absent line: worth it for the first few.
         std::size_t hints = 0;
         for (const DesignPort& port : m_design.ports) {
@@ -450,7 +454,9 @@ private:
             std::string text = "port '" + port.name + "' has no pin";
             if (hints < 20) {
                 ++hints;
-                std::string near = ClosestName(port.name, m_absentNames);
+                long at = ClosestFoldedIndex(port.name, foldedAbsent);
+                std::string near =
+                    at < 0 ? std::string() : m_absentNames[static_cast<std::size_t>(at)];
                 // "LED[0]" beside the design's "led[0]" is the board's other name for
                 // another port, not a slip for "led[2]"; "d_1" is one for "d[1]" itself.
                 auto other = m_foldedPorts.find(FoldedName(near));
