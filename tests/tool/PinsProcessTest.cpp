@@ -434,7 +434,8 @@ TEST_F(PinsProcess, NamesAConstraintFileCannotHoldAreRefusedAndNamesAreShownEsca
 }
 
 // The check is one pass over lines and ports: eight times the bits take about eight times
-// as long, never the square of it.
+// as long (a little more as the memory grows past the caches), where a pass that compares
+// every bit with every line takes sixty-four times as long.
 TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
     auto timed = [&](int bits) {
         std::string json = "{\"modules\": {\"top\": {\"attributes\": {\"top\": 1}, "
@@ -456,7 +457,7 @@ TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
     timed(1000); // the chip database's pages are warm for both runs
     double small = timed(5000);
     double large = timed(40000);
-    EXPECT_LT(large, 8 * small + 0.5) << small << " s for 5000 bits, " << large << " s for 40000";
+    EXPECT_LT(large, 12 * small + 0.5) << small << " s for 5000 bits, " << large << " s for 40000";
 
     // More ports than pins: refused before any is placed, the file untouched.
     Snapshot before = Take(m_dir / "wide.pcf");
