@@ -164,6 +164,19 @@ TEST_F(BoardProcess, ADisagreeingConstraintFileWaitsForPrefer) {
     EXPECT_EQ(Run("from-board", board).status, 2);
 }
 
+TEST_F(BoardProcess, ABoardsOtherNamesForAPadAreNoDisagreement) {
+    // A board-wide file names pads under ports the design lacks; those lines hold no pin,
+    // so the board's plan goes over them and keeps them.
+    const std::string before = "set_io --warn-no-port CLK_12M 21\nset_io -nowarn LED_RED 99\n";
+    WriteBytes(m_pcf, before);
+    Result r = Run("from-board", {"--board", DataFile("board1k-kicad5.net")});
+    ASSERT_EQ(r.status, 0) << r.out << r.err;
+    EXPECT_FALSE(Contains(r.out, "Disagreements")) << r.out;
+    const std::string after = Slurp(m_pcf);
+    EXPECT_EQ(after.rfind(before, 0), 0u) << after;
+    EXPECT_TRUE(Contains(after, "set_io clk 21")) << after;
+}
+
 TEST_F(BoardProcess, AStaleNetlistIsCaughtAgainstItsBoard) {
     std::string stale = Slurp(DataFile("board1k-kicad6.net"));
     stale.replace(stale.find("(pin \"99\")"), 10, "(pin \"95\")");

@@ -60,13 +60,13 @@ protected:
 TEST_F(PlanTable, OneRowPerPortWithWhatThePinIs) {
     // 21 drives a global buffer; 1 and 2 are the two blocks of one bank-3 tile, an LVDS
     // pair; 99 is on the right edge.
-    auto pcf = Pcf("set_io -pullup yes -pullup_resistor 10K clk 21\nset_io led[0] 1\n"
+    auto pcf = Pcf("set_io -pullup yes clk 21\nset_io led[0] 1\n"
                    "set_io led[1] 99\n");
     auto rows = Rows(VnTool::PlanCsv(OneK(), design, "top.json", pcf));
     ASSERT_EQ(rows.size(), 5u);
     EXPECT_EQ(rows[0], VnTool::PlanCsvColumns());
-    std::vector<std::string> clk = {"clk", "output", "21",      "3",         "0",  "8",
-                                    "1",   "yes",    "yes 10K", "SB_LVCMOS", "22", ""};
+    std::vector<std::string> clk = {"clk", "output", "21",  "3",         "0",  "8",
+                                    "1",   "yes",    "yes", "SB_LVCMOS", "22", ""};
     EXPECT_EQ(rows[1], clk);
     std::vector<std::string> led0 = {"led[0]", "output", "1", "3",         "0", "14",
                                      "1",      "no",     "",  "SB_LVCMOS", "2", ""};

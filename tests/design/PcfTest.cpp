@@ -102,10 +102,17 @@ TEST(Pcf, SyntaxErrorsNameFileAndLine) {
         {"# ok\nset_io\n", "p.pcf:2: expected 'set_io [options] PORT PIN'"},
         {"set_io -nowarn a # 3\n", "p.pcf:1: expected 'set_io [options] PORT PIN'"},
         {"\n\nset_io -pullup maybe a 1\n",
-         "p.pcf:3: invalid value 'maybe' for -pullup (yes or no)"},
+         "p.pcf:3: invalid value 'maybe' for -pullup (yes, no, 1 or 0)"},
         {"set_io -pullup_resistor 5K a 1\n",
          "p.pcf:1: invalid value '5K' for -pullup_resistor (3P3K, 6P8K, 10K or 100K)"},
         {"set_io a 1\r\nset_io -pullup\r\n", "p.pcf:2: -pullup wants a value"},
+        {"set_frequency clk\n", "p.pcf:1: expected 'set_frequency NET MHZ'"},
+        {"set_frequency clk abc\n",
+         "p.pcf:1: the frequency 'abc' is no number of MHz (such as 12 or 48.5)"},
+        // Saved with carriage returns alone: nextpnr-ice40 would read one line.
+        {"set_io a 1\rset_io b 2\r",
+         "p.pcf:1: a carriage return without a line feed inside the line: nextpnr-ice40 reads "
+         "the words after it as part of this line (save the file with LF or CRLF line ends)"},
     };
     for (const Case& c : cases) {
         PcfFile pcf;
@@ -114,6 +121,46 @@ TEST(Pcf, SyntaxErrorsNameFileAndLine) {
         EXPECT_EQ(error, c.error);
         EXPECT_TRUE(pcf.Lines().empty());
     }
+}
+
+// The separators and comments nextpnr-ice40 0.4 reads, each tried against it: form feed
+// and vertical tab split words, "\r\r\n" ends a line, a lone '-' is an option it ignores,
+// '#' inside a word starts a comment, and 1 or 0 are pull-up values.
+TEST(Pcf, WordsCommentsAndLineEndsAreSplitAsNextpnrSplitsThem) {
+    PcfFile pcf;
+    std::string error;
+    const std::string text = "set_io\fclk\v21#osc\r\r\n"
+                             "set_io - -pullup 1 led[0] 99\n"
+                             "set_io --warn-no-port led[1] 98 # board\r\n"
+                             "set_frequency clk 12.5\r";
+    ASSERT_TRUE(pcf.Parse(text, "p.pcf", error)) << error;
+    const auto& lines = pcf.Lines();
+    ASSERT_EQ(lines.size(), 4u);
+    EXPECT_EQ(lines[0].port, "clk");
+    EXPECT_EQ(lines[0].pin, "21");
+    EXPECT_EQ(lines[0].end, "\r\r\n");
+    EXPECT_EQ(lines[1].port, "led[0]");
+    EXPECT_EQ(lines[1].notes, std::vector<std::string>{"nextpnr-ice40 ignores the option '-'"});
+    EXPECT_TRUE(lines[2].noWarn);
+    EXPECT_EQ(lines[3].end, "\r");
+    EXPECT_EQ(pcf.Text(), text);
+
+    // A constraint added after a last line ended by a carriage return alone must not join
+    // it: the line gets its line feed first.
+    pcf.Assign("rst", "7");
+    EXPECT_EQ(pcf.Text(), text + "\nset_io rst 7\r\r\n");
+    PcfFile back;
+    ASSERT_TRUE(back.Parse(pcf.Text(), "p.pcf", error)) << error;
+    EXPECT_EQ(VnTool::PcfAssignments(back), VnTool::PcfAssignments(pcf));
+}
+
+TEST(Pcf, NamesAConstraintFileCannotHoldAreTold) {
+    EXPECT_EQ(VnTool::PcfWordProblem("led[0]"), "");
+    EXPECT_EQ(VnTool::PcfWordProblem("\\odd$name"), "");
+    for (const char* bad : {"", "-x", "a#b", "a b", "a\tb", "a\nb", "a\rb", "a\fb"}) {
+        EXPECT_NE(VnTool::PcfWordProblem(bad), "") << bad;
+    }
+    EXPECT_EQ(VnTool::PcfWordProblem(std::string("a\0b", 3)), "it holds a NUL character");
 }
 
 TEST(Pcf, WhatNextpnrIgnoresIsNotedOnTheLine) {

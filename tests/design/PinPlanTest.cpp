@@ -12,6 +12,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <map>
 #include <sstream>
 
@@ -91,7 +92,7 @@ std::vector<std::string> Messages(const std::vector<PinProblem>& problems) {
     return messages;
 }
 
-TEST(PinChecks, EachMistakeIsReportedAtItsLine) {
+TEST(PinChecks, EachMistakeIsReportedAtItsLineErrorsFirst) {
     ChipDb db = Device();
     Design design = Counter();
     PcfFile pcf = Pcf("# plan\n"
@@ -106,7 +107,9 @@ TEST(PinChecks, EachMistakeIsReportedAtItsLine) {
                       "set_io -nowarn spare 5\n" // not in the design, but said so
                       "set_io d[0] 6\n"
                       "set_foo x\n");
-    auto problems = VnTool::CheckPins(db, design, "top.json", pcf, false);
+    VnTool::CheckSummary summary;
+    auto problems =
+        VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}, &summary);
     EXPECT_EQ(
         Messages(problems),
         (std::vector<std::string>{
@@ -114,31 +117,210 @@ TEST(PinChecks, EachMistakeIsReportedAtItsLine) {
             "p.pcf:5: error: pin 1 already holds port 'led[0]' (line 4)",
             "p.pcf:7: error: port 'led[2]' is put on two pins: 2 (line 6) and 3",
             "p.pcf:8: error: duplicate constraint: port 'led[0]' is already on pin 1 (line 4)",
-            // NOLINTNEXTLINE(bugprone-suspicious-missing-comma): one message, split to fit
-            "p.pcf:9: error: design top.json has no port 'ghost' (add -nowarn to keep the line "
-            "anyway)",
             "p.pcf:12: error: nextpnr-ice40 knows no PCF command 'set_foo'",
-            "top.json: warning: port 'd[1]' has no pin",
+            // NOLINTNEXTLINE(bugprone-suspicious-missing-comma): one message, split to fit
+            "top.json: error: port 'd[1]' has no pin; nextpnr-ice40 refuses an unconstrained "
+            "port unless given --pcf-allow-unconstrained",
+            // NOLINTNEXTLINE(bugprone-suspicious-missing-comma): one message, split to fit
+            "p.pcf:9: warning: design top.json has no port 'ghost'; the line is kept "
+            "(-nowarn or --warn-no-port says it may be absent)",
         }));
-    EXPECT_TRUE(VnTool::HasErrors(problems));
     EXPECT_EQ(problems[1].port, "led[1]");
     EXPECT_EQ(problems[1].pin, "1");
+    EXPECT_EQ(summary.absentLines, 2u);
+    EXPECT_EQ(summary.keptSilently, 1u);
+
+    // The board file's exact reading: the stray line is an error of its own.
+    VnTool::CheckOptions strict;
+    strict.strict = true;
+    auto exact = Messages(VnTool::CheckPins(db, design, "top.json", pcf, strict));
+    EXPECT_NE(std::find(exact.begin(), exact.end(),
+                        "p.pcf:9: error: design top.json has no port 'ghost' (add -nowarn to keep "
+                        "the line anyway)"),
+              exact.end());
 }
 
-TEST(PinChecks, APortWithoutPinIsAnErrorOnlyWhenStrict) {
+// A board file names every pin of the board; a design uses a few. Lines for the ports it
+// lacks are read as nextpnr-ice40 reads them: they hold no pin, their pins need not be in
+// this package, and aliases of one pad are no conflict.
+TEST(PinChecks, ABoardFilesLinesForAbsentPortsHoldNoPin) {
+    ChipDb db = Device();
+    Design design = Counter();
+    PcfFile pcf = Pcf("set_io\t--warn-no-port LED_RED_N 1\t# red\n"
+                      "set_io -nowarn LED_RGB[0] 1\n" // another name of the same pad
+                      "set_io -nowarn FLASH_CS 77\n"  // a pin of the board's larger package
+                      "set_io clk 8\nset_io rst 7\n"
+                      "set_io led[0] 1\n" // the design's own port on the aliased pad
+                      "set_io led[1] 2\nset_io led[2] 3\nset_io d[0] 4\nset_io d[1] 5\n");
+    VnTool::CheckSummary summary;
+    auto problems =
+        VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}, &summary);
+    EXPECT_EQ(
+        Messages(problems),
+        std::vector<std::string>{"p.pcf:3: warning: pin '77' is not in package p of device t"});
+    EXPECT_EQ(summary.absentLines, 3u);
+    EXPECT_EQ(summary.keptSilently, 3u);
+
+    // Two present ports on the aliased pad are the conflict, named by the port that holds it.
+    pcf.Assign("led[1]", "1");
+    auto shared = Messages(VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}));
+    ASSERT_FALSE(shared.empty());
+    EXPECT_EQ(shared[0], "p.pcf:7: error: pin 1 already holds port 'led[0]' (line 6)");
+}
+
+// A slip in a board file shows where the design's port went missing.
+TEST(PinChecks, ATypoOnANowarnLineLeavesAPortUnconstrainedAndSaysWhere) {
     ChipDb db = Device();
     Design design = Counter();
     PcfFile pcf = Pcf("set_io clk 8\nset_io rst 7\nset_io led[0] 1\nset_io led[1] 2\n"
-                      "set_io led[2] 3\nset_io d[0] 4\nset_frequency clk 12\n");
-    auto lax = VnTool::CheckPins(db, design, "top.json", pcf, false);
-    EXPECT_EQ(Messages(lax), std::vector<std::string>{"top.json: warning: port 'd[1]' has no pin"});
-    EXPECT_FALSE(VnTool::HasErrors(lax));
-    auto strict = VnTool::CheckPins(db, design, "top.json", pcf, true);
-    EXPECT_EQ(Messages(strict),
-              std::vector<std::string>{"top.json: error: port 'd[1]' has no pin"});
+                      "set_io led[3] 3\n" // led is led[0..2]
+                      "set_io d[0] 4\nset_io -nowarn d_1 5\n");
+    auto problems =
+        Messages(VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}));
+    EXPECT_EQ(problems,
+              (std::vector<std::string>{
+                  "top.json: error: port 'led[2]' has no pin (p.pcf:5 names 'led[3]': did you "
+                  "mean 'led[2]'?); nextpnr-ice40 refuses an unconstrained port unless given "
+                  "--pcf-allow-unconstrained",
+                  "top.json: error: port 'd[1]' has no pin (p.pcf:7 names 'd_1': did you mean "
+                  "'d[1]'?); nextpnr-ice40 refuses an unconstrained port unless given "
+                  "--pcf-allow-unconstrained",
+                  "p.pcf:5: warning: design top.json has no port 'led[3]' (bus 'led' has bits 0 "
+                  "to 2) (did you mean led[2]?); the line is kept (-nowarn or --warn-no-port "
+                  "says it may be absent)",
+              }));
+    VnTool::CheckOptions allow;
+    allow.allowUnconstrained = true;
+    EXPECT_FALSE(VnTool::HasErrors(VnTool::CheckPins(db, design, "top.json", pcf, allow)));
+}
 
-    pcf.Assign("d[1]", "5");
-    EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, true).empty());
+TEST(PinChecks, APullupResistorIsOnlyForUltraPlus) {
+    ChipDb db = Device();
+    Design design;
+    design.ports = {Port("a", -1, 1)};
+    auto problems = Messages(VnTool::CheckPins(
+        db, design, "top.json", Pcf("set_io -pullup_resistor 10K -nowarn b 2\nset_io a 1\n"),
+        VnTool::CheckOptions{}));
+    EXPECT_EQ(problems, std::vector<std::string>{
+                            "p.pcf:1: error: -pullup_resistor is only for UltraPlus parts (up5k, "
+                            "up3k); device t has fixed pull-ups"});
+}
+
+// The test device with the hard blocks of a larger one: a PLL whose pad is pin 8 and
+// whose second output takes pin 7, and an LED driver on pins 1 to 3.
+ChipDb DeviceWithHardBlocks() {
+    ChipDb db;
+    std::istringstream in(kDevice + Tiles(6, 6) +
+                          ".extra_cell 3 0 PLL\nLOCKED q\nPLLOUT_A 3 0 1\nPLLOUT_B 2 0 0\n"
+                          "DIVF_0 0 1 PLLCONFIG_5\n"
+                          ".extra_cell 0 4 0 RGBA_DRV\nRGB0 1 5 0\nRGB1 2 5 0\nRGB2 3 5 0\n"
+                          "CURREN 0 4 lutff_6/in_3\n");
+    std::string error;
+    EXPECT_TRUE(VnTool::ReadChipDb(in, "t.txt", "p", db, error)) << error;
+    return db;
+}
+
+VnTool::DesignPort PadPort(const std::string& name, VnTool::PadUse use, int index = -1) {
+    VnTool::DesignPort port = Port(name, -1, 1);
+    port.padUse = use;
+    port.padIndex = index;
+    port.padCell = use == VnTool::PadUse::PllInput ? "SB_PLL40_2F_PAD" : "SB_X";
+    return port;
+}
+
+Design HardBlockDesign() {
+    using VnTool::PadUse;
+    Design design;
+    design.ports = {PadPort("ref", PadUse::PllInput),    PadPort("r", PadUse::LedDriver, 0),
+                    PadPort("g", PadUse::LedDriver, 1),  PadPort("b", PadUse::LedDriver, 2),
+                    PadPort("lv", PadUse::Differential), PadPort("x", PadUse::Plain)};
+    design.padPlls = 1;
+    design.twoOutputPlls = 1;
+    design.ledDriver = true;
+    return design;
+}
+
+TEST(HardBlocks, AutoAssignPutsEachPortOnTheOnePadThatIsRightAndKeepsTheOthersOff) {
+    ChipDb db = DeviceWithHardBlocks();
+    Design design = HardBlockDesign();
+    PcfFile pcf = Pcf("");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    // The differential input takes pin 5 and keeps its partner 6 free; the PLL's second
+    // output keeps 7; the plain port gets the first pin left.
+    EXPECT_EQ(given,
+              (std::vector<std::pair<std::string, std::string>>{
+                  {"ref", "8"}, {"r", "1"}, {"g", "2"}, {"b", "3"}, {"lv", "5"}, {"x", "4"}}));
+    EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}).empty());
+}
+
+TEST(HardBlocks, EachBrokenRuleIsAnErrorNamingThePinsThatWouldBeRight) {
+    ChipDb db = DeviceWithHardBlocks();
+    Design design = HardBlockDesign();
+    const std::string good = "set_io r 1\nset_io g 2\nset_io b 3\nset_io ref 8\n"
+                             "set_io lv 5\nset_io x 9\n";
+    struct Case {
+        std::string from;
+        std::string to;
+        std::string says;
+    };
+    const Case cases[] = {
+        {"set_io ref 8", "set_io ref 10",
+         "p.pcf:4: error: port 'ref' feeds SB_PLL40_2F_PAD through its pad, so it must be on a "
+         "PLL's pad: 8"},
+        {"set_io g 2", "set_io g 4",
+         "p.pcf:2: error: port 'g' is output RGB1 of the LED driver, whose pad is fixed: pin 2 "
+         "(nextpnr-ice40 puts it there whatever the line says)"},
+        {"set_io x 9", "set_io x 7",
+         "p.pcf:6: error: pin 7 is the pad of the second output of SB_PLL40_2F_PAD, which the "
+         "design uses; put 'x' elsewhere"},
+        {"set_io lv 5", "set_io lv 6",
+         "p.pcf:5: error: differential input 'lv' must be on the first pin of a pair whose "
+         "second pin is bonded: 5"},
+        {"set_io x 9", "set_io x 6",
+         "p.pcf:5: error: differential input 'lv' takes its pair's second pin 6, which holds "
+         "port 'x' (line 6)"},
+    };
+    for (const Case& c : cases) {
+        std::string text = good;
+        text.replace(text.find(c.from), c.from.size(), c.to);
+        auto problems =
+            Messages(VnTool::CheckPins(db, design, "top.json", Pcf(text), VnTool::CheckOptions{}));
+        ASSERT_FALSE(problems.empty()) << c.to;
+        EXPECT_EQ(problems[0], c.says);
+    }
+    // Another port on an LED pad, when the other LED port is elsewhere.
+    Design two = design;
+    two.ports[2].padUse = VnTool::PadUse::Plain;
+    auto problems =
+        Messages(VnTool::CheckPins(db, two, "top.json", Pcf(good), VnTool::CheckOptions{}));
+    ASSERT_FALSE(problems.empty());
+    EXPECT_EQ(problems[0], "p.pcf:2: error: pin 2 is the pad of output RGB1 of the LED driver, "
+                           "which the design uses; put 'g' elsewhere");
+    // In a package where the PLL is not bonded out, there is no right pad.
+    ChipDb locked;
+    std::istringstream in(".device t 6 6 0\n.pins q\n8 3 0 1\n" + Tiles(6, 6) +
+                          ".extra_cell 3 0 PLL\nLOCKED q\nPLLOUT_A 3 0 1\n");
+    std::string error;
+    ASSERT_TRUE(VnTool::ReadChipDb(in, "t.txt", "q", locked, error)) << error;
+    Design pll;
+    pll.ports = {PadPort("ref", VnTool::PadUse::PllInput)};
+    EXPECT_EQ(Messages(VnTool::CheckPins(locked, pll, "top.json", Pcf("set_io ref 8\n"),
+                                         VnTool::CheckOptions{})),
+              std::vector<std::string>{"p.pcf:1: error: port 'ref' feeds SB_PLL40_2F_PAD through "
+                                       "its pad, so it must be on a PLL's pad: none in this "
+                                       "package"});
+}
+
+// A bus goes to the first bank with room for all of it, the last bank included.
+TEST(AutoAssign, ABusFitsWhenOnlyTheLastBankHasRoom) {
+    ChipDb db = Device();
+    Design design;
+    design.ports = {Port("w", 0, 2), Port("w", 1, 2)};
+    PcfFile pcf = Pcf("set_io -nowarn a 1\nset_io -nowarn b 2\nset_io -nowarn c 4\n"
+                      "set_io -nowarn d 5\nset_io -nowarn e 7\n");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    EXPECT_EQ(given,
+              (std::vector<std::pair<std::string, std::string>>{{"w[0]", "9"}, {"w[1]", "10"}}));
 }
 
 TEST(PinChecks, AClockOffTheGlobalBufferPinsIsAWarningNamingThem) {

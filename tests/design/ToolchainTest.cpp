@@ -260,6 +260,12 @@ TEST_F(Toolchain, PlansTheCheckRefusesAreRefusedByNextpnr) {
     VnTool::PcfFile shared = base;
     shared.Unassign("led[7]");
     shared.Assign("led[7]", ledPin);
+    // The plan with led[7]'s line replaced by `line`.
+    auto without = [&](const std::string& line) {
+        VnTool::PcfFile pcf = base;
+        pcf.Unassign("led[7]");
+        return pcf.Text() + line + "\n";
+    };
     struct Case {
         const char* tag;
         std::string text;
@@ -276,13 +282,19 @@ TEST_F(Toolchain, PlansTheCheckRefusesAreRefusedByNextpnr) {
         {"shared-pin", shared.Text(), "already holds port", "cannot be bound to bel"},
         {"unknown-command", good + "set_foo 1\n", "knows no PCF command 'set_foo'",
          "unsupported PCF command 'set_foo'"},
+        {"no-io-pin", without("set_io led[7] 5"), "pin '5' is not in package tq144",
+         "package does not have a pin named '5'"},
+        {"bus-index", without("set_io led[8] " + freePin), "names 'led[8]'",
+         "IO 'led[7]' is unconstrained"},
+        {"nowarn-typo", without("set_io -nowarn lde[7] " + freePin), "names 'lde[7]'",
+         "IO 'led[7]' is unconstrained"},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.tag);
         VnTool::PcfFile pcf;
         std::string error;
         ASSERT_TRUE(pcf.Parse(c.text, c.tag, error)) << error;
-        auto problems = VnTool::CheckPins(db, design, "top.json", pcf, false);
+        auto problems = VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{});
         ASSERT_TRUE(VnTool::HasErrors(problems));
         bool named = false;
         for (const auto& problem : problems) {
@@ -295,18 +307,32 @@ TEST_F(Toolchain, PlansTheCheckRefusesAreRefusedByNextpnr) {
         EXPECT_NE(log.find(c.theirs), std::string::npos) << log;
     }
 
-    // Stricter on purpose: a line for a port the design lacks is a mistake to us; nextpnr
-    // only warns, and with -nowarn both let it pass.
+    // A line without its pin is refused by the reader, and by nextpnr.
+    {
+        VnTool::PcfFile pcf;
+        std::string error;
+        EXPECT_FALSE(pcf.Parse(without("set_io led[7]"), "no-pin", error));
+        EXPECT_NE(error.find("expected 'set_io [options] PORT PIN'"), std::string::npos) << error;
+        std::map<std::string, std::string> bels;
+        std::string log;
+        EXPECT_NE(Place(kOneK, without("set_io led[7]"), "no-pin", bels, log), 0);
+        EXPECT_NE(log.find("expected PCF syntax 'set_io cell pin'"), std::string::npos) << log;
+    }
+
+    // A line for a port the design lacks is a warning to both; the strict reading makes it
+    // an error for those who want a board file exact.
     VnTool::PcfFile stale;
     std::string error;
     ASSERT_TRUE(stale.Parse(good + "set_io ghost 2\n", "stale", error));
-    ASSERT_TRUE(VnTool::HasErrors(VnTool::CheckPins(db, design, "top.json", stale, false)));
+    EXPECT_FALSE(VnTool::HasErrors(
+        VnTool::CheckPins(db, design, "top.json", stale, VnTool::CheckOptions{})));
+    VnTool::CheckOptions strict;
+    strict.strict = true;
+    EXPECT_TRUE(VnTool::HasErrors(VnTool::CheckPins(db, design, "top.json", stale, strict)));
     std::map<std::string, std::string> bels;
     std::string log;
     EXPECT_EQ(Place(kOneK, stale.Text(), "stale", bels, log), 0) << log;
     EXPECT_NE(log.find("unmatched constraint 'ghost'"), std::string::npos) << log;
-    ASSERT_TRUE(stale.Parse(good + "set_io -nowarn ghost 2\n", "stale", error));
-    EXPECT_FALSE(VnTool::HasErrors(VnTool::CheckPins(db, design, "top.json", stale, false)));
 }
 
 } // namespace

@@ -178,3 +178,73 @@ TEST(YosysPorts, BadInputIsRefusedInOneLineNamingFileAndLine) {
 }
 
 } // namespace
+
+namespace {
+
+// The cells that decide where a pad goes, as yosys writes them: the pad connection among
+// others, parameters before or after it.
+TEST(YosysPorts, PadCellsSayWhatEachPortsPadMustBe) {
+    const char netlist[] = R"({"modules": {"top": {
+      "attributes": {"top": "00000000000000000000000000000001"},
+      "ports": {"ref": {"direction": "input", "bits": [2]},
+                "gb": {"direction": "input", "bits": [3]},
+                "rgb": {"direction": "output", "bits": [4, 5, 6]},
+                "lv": {"direction": "input", "bits": [7]},
+                "od": {"direction": "output", "bits": [8]},
+                "plain": {"direction": "input", "bits": [9]}},
+      "cells": {
+        "pll": {"type": "SB_PLL40_2F_PAD", "parameters": {"DIVF": "0111111"},
+                "connections": {"PACKAGEPIN": [2], "PLLOUTGLOBALA": [20]}},
+        "g": {"type": "SB_GB_IO", "connections": {"PACKAGE_PIN": [3], "GLOBAL_BUFFER_OUTPUT": [21]}},
+        "drv": {"type": "SB_RGBA_DRV", "connections": {"RGB0": [4], "RGB1": [5], "RGB2": [6],
+                "RGB0PWM": [22]}},
+        "l": {"type": "SB_IO", "connections": {"PACKAGE_PIN": [7], "D_IN_0": [23]},
+              "parameters": {"IO_STANDARD": "SB_LVDS_INPUT", "PIN_TYPE": "000001"}},
+        "o": {"type": "SB_IO_OD", "connections": {"PACKAGEPIN": [8]}}
+      }}}})";
+    Design design;
+    std::string error;
+    ASSERT_TRUE(Read(netlist, design, error)) << error;
+    auto ports = ByName(design);
+    using VnTool::PadUse;
+    EXPECT_EQ(ports["ref"]->padUse, PadUse::PllInput);
+    EXPECT_EQ(ports["ref"]->padCell, "SB_PLL40_2F_PAD");
+    EXPECT_EQ(ports["gb"]->padUse, PadUse::GlobalBuffer);
+    EXPECT_TRUE(ports["gb"]->clock);
+    for (int i = 0; i < 3; ++i) {
+        const auto* led = ports["rgb[" + std::to_string(i) + "]"];
+        EXPECT_EQ(led->padUse, PadUse::LedDriver);
+        EXPECT_EQ(led->padIndex, i);
+    }
+    EXPECT_EQ(ports["lv"]->padUse, PadUse::Differential);
+    EXPECT_EQ(ports["od"]->padUse, PadUse::Plain);
+    EXPECT_EQ(ports["plain"]->padCell, "");
+    EXPECT_EQ(design.padPlls, 1);
+    EXPECT_EQ(design.twoOutputPlls, 1);
+    EXPECT_TRUE(design.ledDriver);
+}
+
+// A bit index is named in the constraint file: one that does not fit an int would wrap
+// round into the name of another bit.
+TEST(YosysPorts, AnOffsetBeyondTheIndicesAConstraintCanNameIsRefused) {
+    for (const char* offset :
+         {"9223372036854775807", "18446744073709551615", "2147483647", "-2147483649"}) {
+        std::string netlist = std::string(R"({"modules": {"top": {"ports": {)") +
+                              R"("d": {"direction": "input", "bits": [2, 3], "offset": )" + offset +
+                              "}}}}}";
+        Design design;
+        std::string error;
+        EXPECT_FALSE(Read(netlist, design, error)) << offset;
+        EXPECT_NE(error.find("beyond the indices a constraint can name"), std::string::npos)
+            << error;
+    }
+    Design design;
+    std::string error;
+    ASSERT_TRUE(Read(R"({"modules": {"top": {"ports": {"d": {"direction": "input", )"
+                     R"("bits": [2, 3], "offset": 2147483646}}}}})",
+                     design, error))
+        << error;
+    EXPECT_EQ(design.ports[1].name, "d[2147483647]");
+}
+
+} // namespace

@@ -13,6 +13,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
@@ -151,6 +152,7 @@ TEST_F(PinsProcess, EachPinsCommandHasHelpAndBadUsageIsExitTwoWithOneLine) {
         {"pins", "check", "--design", m_json, "--pcf", "x.pcf", "--chipdb", "a", "--device", "1k"},
         {"pins", "check", "--design", m_json, "--pcf", "x.pcf", "--device", "../1k"},
         {"pins", "show", "--design", m_json, "--pcf", "x.pcf", "--flags", "exact"},
+        {"pins", "assign", "--design", m_json, "--pcf", "x.pcf", "rst=2", "rst=3"},
     };
     for (const auto& args : bad) {
         Result result = Run(args);
@@ -190,14 +192,18 @@ TEST_F(PinsProcess, AssignCreatesTheFileThenChecksCleanAndKeepsWhatItDoesNotOwn)
     EXPECT_TRUE(std::regex_search(check.out, std::regex(R"(\n  clk +input +yes +21 +3 +ok\n)")))
         << check.out;
 
-    // Unassigning leaves a port without a pin: a warning, an error only when strict.
+    // Unassigning leaves a port without a pin: an error, as nextpnr-ice40 makes it, and a
+    // warning when allowed as its --pcf-allow-unconstrained allows it.
     ASSERT_EQ(Pins("assign", pcf.string(), {"--unassign", "led[7]", "--unassign", "led[6]"}).status,
               0);
     EXPECT_FALSE(Contains(Slurp(pcf), "led[7]"));
-    Result loose = Pins("check", pcf.string());
-    EXPECT_EQ(loose.status, 0) << loose.out;
-    EXPECT_TRUE(Contains(loose.out, "warning: port 'led[7]' has no pin")) << loose.out;
-    EXPECT_EQ(Pins("check", pcf.string(), {"--strict"}).status, 1);
+    Result unconstrained = Pins("check", pcf.string());
+    EXPECT_EQ(unconstrained.status, 1) << unconstrained.out;
+    EXPECT_TRUE(Contains(unconstrained.out, "error: port 'led[7]' has no pin"))
+        << unconstrained.out;
+    Result allowed = Pins("check", pcf.string(), {"--allow-unconstrained"});
+    EXPECT_EQ(allowed.status, 0) << allowed.out;
+    EXPECT_TRUE(Contains(allowed.out, "warning: port 'led[7]' has no pin")) << allowed.out;
 
     // Nothing to change: the file is not rewritten.
     Snapshot before = Take(pcf);
@@ -309,6 +315,157 @@ TEST_F(PinsProcess, ShowLabelsAssignedPinsAndMarksProblemsAndSearchesPorts) {
     ASSERT_EQ(moved.status, 0) << moved.err;
     EXPECT_TRUE(Contains(moved.out, "Pins: 1 assigned, 1 with problems")) << moved.out;
     EXPECT_TRUE(Contains(Slurp(m_dir / "plan.svg"), "class=\"pin problem\""));
+}
+
+// A board's constraint file names every pin of the board, as boards' files do: aliases of
+// one pad, lines for ports this design lacks with and without -nowarn or --warn-no-port,
+// a frequency, tabs, trailing comments, configuration pins.
+const char kBoardFile[] = "# evaluation board, rev C\n"
+                          "set_io\t--warn-no-port\tLED_RED_N  99\t# D1\n"
+                          "set_io -nowarn LED_RGB[0] 99   # the same pad, another name\n"
+                          "set_io -nowarn LED_RGB[1] 98\n"
+                          "set_io UART_TX 8\n"
+                          "set_io UART_RX 9 # to the FTDI\n"
+                          "set_io -nowarn FLASH_SCK 70\nset_io -nowarn FLASH_SS 71\n"
+                          "set_io -nowarn CDONE 65    # configuration pin\n"
+                          "set_io -nowarn CRESET_B 66\n"
+                          "set_io clk 21\nset_frequency clk 12\n"
+                          "set_io rst 3\n"
+                          "set_io led[0] 99\nset_io led[1] 98\nset_io led[2] 97\n"
+                          "set_io led[3] 96\nset_io led[4] 95\nset_io led[5] 94\n"
+                          "set_io led[6] 93\nset_io led[7] 91\n";
+
+TEST_F(PinsProcess, ABoardFileIsAcceptedAndOnlyTheDesignsOwnPortsAreJudged) {
+    fs::path pcf = m_dir / "board.pcf";
+    WriteBytes(pcf, kBoardFile);
+    Result check = Pins("check", pcf.string());
+    EXPECT_EQ(check.status, 0) << check.out << check.err;
+    EXPECT_TRUE(Contains(check.out, "board.pcf:5: warning: design ")) << check.out;
+    // The configuration pins are no I/O of this package: a warning on an absent port's line.
+    EXPECT_TRUE(Contains(check.out, "board.pcf:9: warning: pin '65' is not in package tq144"))
+        << check.out;
+    EXPECT_TRUE(Contains(check.out, "board.pcf: 9 lines for ports the design lacks, kept (7 of "
+                                    "them marked -nowarn or --warn-no-port)"))
+        << check.out;
+    EXPECT_TRUE(Contains(check.out, "10 ports: 10 on pins, 0 without; 0 errors, 4 warnings"))
+        << check.out;
+    // Strict, the same file is the exact list it is not.
+    EXPECT_EQ(Pins("check", pcf.string(), {"--strict"}).status, 1);
+
+    // A pin of a line for an absent port holds nothing against the design: rst may move
+    // onto the aliased pad's neighbour that only the flash names, and the refusal for a
+    // real conflict names the port that holds the pin.
+    Result moved = Pins("assign", pcf.string(), {"rst=70"});
+    EXPECT_EQ(moved.status, 0) << moved.err;
+    Result clash = Pins("assign", pcf.string(), {"rst=98"});
+    EXPECT_EQ(clash.status, 1);
+    EXPECT_TRUE(Contains(clash.err, "pin 98 already holds port 'led[1]' (line 15)")) << clash.err;
+
+    // One planted mistake at a time: each refused at its line.
+    struct Planted {
+        std::string from;
+        std::string to;
+        const char* says;
+    };
+    const Planted planted[] = {
+        {"set_io led[7] 91", "set_io led[7] 999", "board.pcf:21: error: pin '999' is not in"},
+        {"set_io led[7] 91", "set_io led[7] 5", "board.pcf:21: error: pin '5' is not in"},
+        {"set_io led[7] 91", "set_io led[7] 93", "board.pcf:21: error: pin 93 already holds"},
+        {"set_io led[7] 91", "set_io led[6] 91", "board.pcf:21: error: port 'led[6]' is put on"},
+        {"set_io led[7] 91", "set_io led[8] 91", "board.pcf:21 names 'led[8]'"},
+        {"set_io rst 3", "set_io -nowarn rts 3", "board.pcf:13 names 'rts'"},
+        {"set_io rst 3", "set_io rst", "board.pcf:13: expected 'set_io [options] PORT PIN'"},
+    };
+    for (const Planted& p : planted) {
+        std::string text = kBoardFile;
+        text.replace(text.find(p.from), p.from.size(), p.to);
+        WriteBytes(pcf, text);
+        Result result = Pins("check", pcf.string());
+        EXPECT_EQ(result.status, 1) << p.to;
+        EXPECT_TRUE(Contains(result.out + result.err, p.says)) << result.out << result.err;
+    }
+}
+
+TEST_F(PinsProcess, PartNamesAreTheToolchainsAndMisspeltNamesGetAHint) {
+    fs::path pcf = m_dir / "top.pcf";
+    WriteBytes(pcf, "");
+    Result hx4k = Run({"pins", "check", "--design", m_json, "--pcf", pcf.string(), "--device",
+                       "hx4k", "--package", "tq144", "--allow-unconstrained"});
+    EXPECT_EQ(hx4k.status, 0) << hx4k.err;
+    EXPECT_TRUE(Contains(hx4k.out, "Device 8k (part hx4k), package tq144:4k")) << hx4k.out;
+    Result up5k = Run({"pins", "check", "--design", m_json, "--pcf", pcf.string(), "--device",
+                       "up5k", "--allow-unconstrained"});
+    EXPECT_TRUE(Contains(up5k.out, "Device 5k (part up5k), package sg48")) << up5k.out;
+
+    Result part =
+        Run({"pins", "check", "--design", m_json, "--pcf", pcf.string(), "--device", "hx8"});
+    EXPECT_EQ(part.status, 1);
+    EXPECT_TRUE(Contains(part.err, "(did you mean hx8k?)")) << part.err;
+    Result package = Run({"pins", "check", "--design", m_json, "--pcf", pcf.string(), "--device",
+                          "8k", "--package", "tq144"});
+    EXPECT_TRUE(Contains(package.err, "(did you mean tq144:4k?)")) << package.err;
+    Result port = Pins("assign", pcf.string(), {"lde[0]=99"});
+    EXPECT_TRUE(Contains(port.err, "has no port 'lde[0]' (did you mean led[0]?)")) << port.err;
+}
+
+// Port names come from the netlist; the file must hold them as they are, and the terminal
+// must show them without their control characters.
+TEST_F(PinsProcess, NamesAConstraintFileCannotHoldAreRefusedAndNamesAreShownEscaped) {
+    auto design = [&](const std::string& name, const std::string& port) {
+        fs::path json = m_dir / name;
+        WriteBytes(json, "{\"modules\": {\"top\": {\"attributes\": {\"top\": 1}, \"ports\": "
+                         "{\"" +
+                             port +
+                             "\": {\"direction\": \"input\", \"bits\": [2]}}, "
+                             "\"cells\": {}, \"netnames\": {}}}}\n");
+        return json.string();
+    };
+    fs::path pcf = m_dir / "top.pcf";
+    for (const char* port : {"a#b", "-a", "a b", "a\\nb"}) {
+        Result result = Pins("assign", pcf.string(), {"--auto"}, design("odd.json", port));
+        EXPECT_EQ(result.status, 1) << port << result.out;
+        EXPECT_TRUE(Contains(result.err, "cannot be written to a constraint file")) << result.err;
+        EXPECT_FALSE(fs::exists(pcf)) << port;
+    }
+    WriteBytes(pcf, "");
+    Result shown = Pins("check", pcf.string(), {"--allow-unconstrained"},
+                        design("esc.json", "a\\u001b[31mred"));
+    EXPECT_FALSE(Contains(shown.out, "\x1b")) << shown.out;
+}
+
+// The check is one pass over lines and ports: eight times the bits take about eight times
+// as long (a little more as the memory grows past the caches), where a pass that compares
+// every bit with every line takes sixty-four times as long.
+TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
+    auto timed = [&](int bits) {
+        std::string json = "{\"modules\": {\"top\": {\"attributes\": {\"top\": 1}, "
+                           "\"ports\": {\"d\": {\"direction\": \"input\", \"bits\": [";
+        std::string pcf;
+        for (int i = 0; i < bits; ++i) {
+            json += (i == 0 ? "" : ",") + std::to_string(i + 2);
+            pcf += "set_io -nowarn other" + std::to_string(i) + " 1\n";
+        }
+        json += "]}}, \"cells\": {}, \"netnames\": {}}}}\n";
+        WriteBytes(m_dir / "wide.json", json);
+        WriteBytes(m_dir / "wide.pcf", pcf);
+        auto start = std::chrono::steady_clock::now();
+        Result result =
+            Pins("check", (m_dir / "wide.pcf").string(), {}, (m_dir / "wide.json").string());
+        EXPECT_EQ(result.status, 1);
+        return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+    };
+    timed(1000); // the chip database's pages are warm for both runs
+    double small = timed(5000);
+    double large = timed(40000);
+    EXPECT_LT(large, 12 * small + 0.5) << small << " s for 5000 bits, " << large << " s for 40000";
+
+    // More ports than pins: refused before any is placed, the file untouched.
+    Snapshot before = Take(m_dir / "wide.pcf");
+    Result full =
+        Pins("assign", (m_dir / "wide.pcf").string(), {"--auto"}, (m_dir / "wide.json").string());
+    EXPECT_EQ(full.status, 1);
+    EXPECT_TRUE(Contains(full.err, "40000 ports without a pin but only 95 free pins")) << full.err;
+    ExpectUntouched(m_dir / "wide.pcf", before, "more ports than pins");
 }
 
 // ---- the judge ------------------------------------------------------------------------

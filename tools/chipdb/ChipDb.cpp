@@ -1,8 +1,10 @@
 //===-- tools/chipdb/ChipDb.cpp - reads the tiles and package pins of a chip database ---===//
 #include "ChipDb.h"
+#include "Suggest.h"
 
 #include "Port/SafeFile.h"
 
+#include <algorithm>
 #include <charconv>
 #include <set>
 #include <unordered_map>
@@ -44,7 +46,7 @@ constexpr std::string_view kKnownSections[] = {
 constexpr std::string_view kOtherTileSections[] = {".dsp0_tile", ".dsp1_tile", ".dsp2_tile",
                                                    ".dsp3_tile", ".ipcon_tile"};
 
-enum class Section { None, Device, Tile, WantedPins, GlobalBufferPins, Skipped };
+enum class Section { None, Device, Tile, WantedPins, GlobalBufferPins, ExtraCell, Skipped };
 
 std::vector<std::string_view> Fields(std::string_view line) {
     std::vector<std::string_view> fields;
@@ -118,6 +120,8 @@ public:
             return PinLine(fields);
         case Section::GlobalBufferPins:
             return GlobalBufferPinLine(fields);
+        case Section::ExtraCell:
+            return ExtraCellLine(fields);
         case Section::None:
             return Fail("text outside any section");
         default:
@@ -136,6 +140,14 @@ public:
         }
         if (!m_wanted.empty() && m_db.package.empty()) {
             error = std::string(m_source) + ": no package \"" + std::string(m_wanted) + "\"";
+            // "tq144" on the 8k file is most likely the 4k parts' "tq144:4k".
+            std::string hint = DidYouMean(m_wanted, m_db.packages);
+            for (const std::string& package : m_db.packages) {
+                if (package.rfind(std::string(m_wanted) + ":", 0) == 0) {
+                    hint = " (did you mean " + package + "?)";
+                }
+            }
+            error += hint;
             error += m_db.packages.empty() ? "; the file has no .pins section"
                                            : "; the file has: " + Join(m_db.packages);
             return false;
@@ -213,6 +225,18 @@ private:
         }
         if (name == ".gbufpin") {
             m_section = Section::GlobalBufferPins;
+            return true;
+        }
+        // The PLLs and LED drivers name the IO blocks they take; the other hard blocks do
+        // not reach the pins.
+        if (name == ".extra_cell" && fields.size() >= 4) {
+            m_extraCell = std::string(fields.back());
+            if (m_extraCell == "PLL") {
+                ++m_plls;
+            }
+            bool wanted =
+                m_extraCell == "PLL" || m_extraCell == "RGBA_DRV" || m_extraCell == "RGB_DRV";
+            m_section = wanted ? Section::ExtraCell : Section::Skipped;
             return true;
         }
         for (std::string_view other : kOtherTileSections) {
@@ -378,9 +402,55 @@ private:
         return true;
     }
 
+    // "PLLOUT_A 6 0 1", "RGB0 4 31 0", "LOCKED cb81 cm36 ...": the lines that place
+    // the block's pads; the rest of the section configures it.
+    bool ExtraCellLine(const std::vector<std::string_view>& f) {
+        const bool pll = m_extraCell == "PLL";
+        if (pll && f[0] == "LOCKED") {
+            m_lockedPlls.emplace_back(m_plls - 1, std::vector<std::string>(f.begin() + 1, f.end()));
+            return true;
+        }
+        HardBlockPad pad;
+        if (pll && (f[0] == "PLLOUT_A" || f[0] == "PLLOUT_B")) {
+            pad.role = f[0] == "PLLOUT_A" ? HardBlockPad::Role::PllInput
+                                          : HardBlockPad::Role::PllSecondOut;
+            pad.block = m_plls - 1;
+        } else if (!pll && (f[0] == "RGB0" || f[0] == "RGB1" || f[0] == "RGB2")) {
+            pad.role = HardBlockPad::Role::LedDriver;
+            pad.block = f[0][3] - '0';
+        } else {
+            return true;
+        }
+        if (f.size() != 4 || !ToInt(f[1], pad.x) || !ToInt(f[2], pad.y) || !ToInt(f[3], pad.pio) ||
+            !m_seenDevice || !InGrid(pad.x, pad.y) || pad.pio < 0) {
+            return Fail("a hard block's pad wants a place in the device: " + std::string(f[0]));
+        }
+        m_db.hardBlockPads.push_back(pad);
+        return true;
+    }
+
     std::string_view m_source;
     std::string_view m_wanted;
     ChipDb& m_db;
+    std::string m_extraCell;
+    int m_plls = 0;
+    std::vector<std::pair<int, std::vector<std::string>>> m_lockedPlls;
+
+public:
+    // A PLL listed as locked in the package read is not bonded out there.
+    void MarkLockedPlls() {
+        for (const auto& [block, packages] : m_lockedPlls) {
+            bool locked =
+                std::find(packages.begin(), packages.end(), m_db.package) != packages.end();
+            for (HardBlockPad& pad : m_db.hardBlockPads) {
+                if (pad.role != HardBlockPad::Role::LedDriver && pad.block == block) {
+                    pad.lockedInPackage = pad.lockedInPackage || locked;
+                }
+            }
+        }
+    }
+
+private:
     std::size_t m_line = 0;
     Section m_section = Section::None;
     bool m_seenDevice = false;
@@ -418,6 +488,15 @@ bool IsGlobalBufferPin(const ChipDb& db, const Pin& pin) {
     return false;
 }
 
+const Pin* PinOfPad(const ChipDb& db, const HardBlockPad& pad) {
+    for (const Pin& pin : db.pins) {
+        if (pin.x == pad.x && pin.y == pad.y && pin.pio == pad.pio) {
+            return &pin;
+        }
+    }
+    return nullptr;
+}
+
 int IoBankOf(int x, int y, int width, int height) {
     if (y == height - 1) {
         return 0;
@@ -451,7 +530,11 @@ bool ReadChipDb(std::istream& in, std::string_view source, std::string_view pack
         error = std::string(source) + ": read error";
         return false;
     }
-    return reader.Finish(error);
+    if (!reader.Finish(error)) {
+        return false;
+    }
+    reader.MarkLockedPlls();
+    return true;
 }
 
 bool ReadChipDbFile(const std::string& path, std::string_view package, ChipDb& db,

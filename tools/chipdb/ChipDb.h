@@ -55,6 +55,22 @@ struct GlobalBufferPin {
     int network = 0; ///< the global network it drives
 };
 
+/// An IO block a hard block of the device is wired to (from the .extra_cell sections):
+/// the PLL's pad and second output, the UltraPlus LED driver's outputs.
+struct HardBlockPad {
+    enum class Role {
+        PllInput,     ///< PLLOUT_A: the pad a SB_PLL40_*PAD's PACKAGEPIN must be on
+        PllSecondOut, ///< PLLOUT_B: taken by a two-output PLL
+        LedDriver,    ///< RGB0..RGB2 of the LED driver (`index`)
+    };
+    Role role = Role::PllInput;
+    int block = 0; ///< which PLL of the device, in file order; the output index for LEDs
+    int x = 0;
+    int y = 0;
+    int pio = 0;
+    bool lockedInPackage = false; ///< the PLL is not bonded out in the package read
+};
+
 struct ChipDb {
     std::string device; ///< the device name of the .device line, such as "8k"
     int width = 0;
@@ -64,7 +80,12 @@ struct ChipDb {
     std::vector<Tile> tiles;                       ///< in file order
     std::vector<Pin> pins;                         ///< in file order
     std::vector<GlobalBufferPin> globalBufferPins; ///< in file order, of every package
+    std::vector<HardBlockPad> hardBlockPads;       ///< in file order
 };
+
+/// The pin of `db`'s package bonded to the IO block of `pad`; null when the package has
+/// none there.
+const Pin* PinOfPad(const ChipDb& db, const HardBlockPad& pad);
 
 /// The IO bank of a tile on the edge of a width x height grid, numbered as this family's
 /// data sheets do: top edge 0, right 1, bottom 2, left 3; -1 for a tile inside.

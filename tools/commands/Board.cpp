@@ -114,6 +114,12 @@ int Settle(const std::string& command, const ParsedArgs& args, BoardPlan& plan,
     for (const auto& [port, pin] : placed) {
         moving.insert(port);
     }
+    // A line for a port the design lacks holds no pin, as the check reads it: a board's
+    // file names one pad under several names, and only the design's ports can disagree.
+    std::set<std::string> present;
+    for (const DesignPort& port : plan.design.ports) {
+        present.insert(port.name);
+    }
     std::vector<std::string> conflicts;
     result = plan.pcf;
     for (const auto& [port, pin] : placed) {
@@ -121,7 +127,7 @@ int Settle(const std::string& command, const ParsedArgs& args, BoardPlan& plan,
         std::vector<std::string> holders;
         for (const PcfLine& line : plan.pcf.Lines()) {
             if (line.kind == PcfLine::Kind::SetIo && line.pin == pin && line.port != port &&
-                moving.count(line.port) == 0) {
+                moving.count(line.port) == 0 && present.count(line.port) != 0) {
                 holders.push_back(line.port);
             }
         }

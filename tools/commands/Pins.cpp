@@ -10,6 +10,7 @@
 #include "DeviceSearch.h"
 #include "PinPlan.h"
 #include "PortHolders.h"
+#include "Suggest.h"
 
 #include "Port/SafeFile.h"
 
@@ -18,6 +19,8 @@
 #include <limits>
 #include <map>
 #include <set>
+#include <unordered_map>
+#include <unordered_set>
 
 namespace VnTool {
 
@@ -76,9 +79,10 @@ void PrintDevice(const Plan& plan) {
         std::printf("Note: %s\n", plan.source.note.c_str());
     }
     const ChipDb& db = plan.model->Db();
-    std::printf("Device %s, package %s: %zu pins; design %s (top %s): %zu ports\n",
-                db.device.c_str(), db.package.empty() ? "(none)" : db.package.c_str(),
-                db.pins.size(), plan.designPath.c_str(), plan.design.top.c_str(),
+    std::string part = plan.source.part.empty() ? "" : " (part " + plan.source.part + ")";
+    std::printf("Device %s%s, package %s: %zu pins; design %s (top %s): %zu ports\n",
+                db.device.c_str(), part.c_str(), db.package.empty() ? "(none)" : db.package.c_str(),
+                db.pins.size(), plan.designPath.c_str(), Port::Printable(plan.design.top).c_str(),
                 plan.design.ports.size());
 }
 
@@ -94,16 +98,28 @@ int Errors(const std::vector<PinProblem>& problems) {
     return errors;
 }
 
-// A file that is no constraint file at all gives an error per line; the first screenful
-// tells as much as all of them.
+// Every error is shown, since any one of them stops place-and-route; warnings come after
+// them and a board file's many may be cut short.
 void PrintProblems(const std::vector<PinProblem>& problems) {
-    const std::size_t shown = 40;
-    for (std::size_t i = 0; i < problems.size() && i < shown; ++i) {
-        std::printf("%s\n", Port::Printable(problems[i].message).c_str());
+    const std::size_t shownWarnings = 40;
+    std::size_t warnings = 0;
+    for (const PinProblem& problem : problems) {
+        bool error = problem.severity == PinProblem::Severity::Error;
+        if (!error && ++warnings > shownWarnings) {
+            continue;
+        }
+        std::printf("%s\n", Port::Printable(problem.message).c_str());
     }
-    if (problems.size() > shown) {
-        std::printf("... and %zu more\n", problems.size() - shown);
+    if (warnings > shownWarnings) {
+        std::printf("... and %zu more warnings\n", warnings - shownWarnings);
     }
+}
+
+CheckOptions ReadingOf(const ParsedArgs& args) {
+    CheckOptions options;
+    options.strict = args.Has("--strict");
+    options.allowUnconstrained = args.Has("--allow-unconstrained");
+    return options;
 }
 
 // ---- check -----------------------------------------------------------------------------
@@ -113,10 +129,17 @@ int RunCheck(const ParsedArgs& args) {
     if (int status = Load(kCheck, args, false, plan); status != kExitOk) {
         return status;
     }
-    bool strict = args.Has("--strict");
-    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, plan.pcf, strict);
+    CheckSummary summary;
+    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, plan.pcf,
+                              ReadingOf(args), &summary);
     PrintDevice(plan);
 
+    // Counted once per port: a table row must not look through every problem.
+    std::unordered_map<std::string, std::pair<int, int>> countOfPort;
+    for (const auto& problem : problems) {
+        auto& [errors, warnings] = countOfPort[problem.port];
+        (problem.severity == PinProblem::Severity::Error ? errors : warnings) += 1;
+    }
     // The table is read from the ports' holders, as the editor's port list is.
     PortHolders ports(plan.design);
     ports.ApplyPins(plan.model->Db(), plan.pcf);
@@ -126,13 +149,9 @@ int RunCheck(const ParsedArgs& args) {
         std::string name = holder->GetName().str();
         std::string pin = ValueText(holder->GetPropertyByName("Pin"));
         std::string bank = ValueText(holder->GetPropertyByName("Bank"));
-        int errors = 0;
-        int warnings = 0;
-        for (const auto& problem : problems) {
-            if (problem.port == name) {
-                (problem.severity == PinProblem::Severity::Error ? errors : warnings) += 1;
-            }
-        }
+        auto counts = countOfPort.find(name);
+        int errors = counts != countOfPort.end() ? counts->second.first : 0;
+        int warnings = counts != countOfPort.end() ? counts->second.second : 0;
         std::string said;
         if (errors > 0) {
             said = Count(static_cast<std::size_t>(errors), "error", "errors");
@@ -142,12 +161,19 @@ int RunCheck(const ParsedArgs& args) {
                     Count(static_cast<std::size_t>(warnings), "warning", "warnings");
         }
         placed += pin.empty() ? 0 : 1;
-        rows.push_back({name, ValueText(holder->GetPropertyByName("Direction")),
-                        ValueText(holder->GetPropertyByName("Clock")), pin.empty() ? "-" : pin,
-                        bank == "-1" ? "-" : bank, said.empty() ? "ok" : said});
+        rows.push_back({Port::Printable(name), ValueText(holder->GetPropertyByName("Direction")),
+                        ValueText(holder->GetPropertyByName("Clock")),
+                        pin.empty() ? "-" : Port::Printable(pin), bank == "-1" ? "-" : bank,
+                        said.empty() ? "ok" : said});
     }
     PrintTable({"Port", "Direction", "Clock", "Pin", "Bank", "Problems"}, rows);
     PrintProblems(problems);
+    if (summary.absentLines > 0) {
+        std::printf("%s: %s for ports the design lacks, kept (%zu of them marked -nowarn or "
+                    "--warn-no-port)\n",
+                    plan.pcfPath.c_str(), Count(summary.absentLines, "line", "lines").c_str(),
+                    summary.keptSilently);
+    }
     int errors = Errors(problems);
     std::printf(
         "%s: %zu on pins, %zu without; %s, %s\n", Count(ports.Size(), "port", "ports").c_str(),
@@ -159,14 +185,149 @@ int RunCheck(const ParsedArgs& args) {
 
 // ---- assign ----------------------------------------------------------------------------
 
-int RunAssign(const ParsedArgs& args) {
-    std::vector<std::pair<std::string, std::string>> wanted;
+// PORT=PIN operands; a port given twice is a slip of the command line, not a plan.
+int ReadAssignments(const ParsedArgs& args,
+                    std::vector<std::pair<std::string, std::string>>& wanted) {
+    std::unordered_set<std::string> seen;
     for (const std::string& operand : args.operands) {
         auto eq = operand.find('=');
         if (eq == std::string::npos || eq == 0 || eq + 1 == operand.size()) {
             return UsageError(kAssign, "an assignment is PORT=PIN, got \"" + operand + "\"");
         }
         wanted.emplace_back(operand.substr(0, eq), operand.substr(eq + 1));
+        if (!seen.insert(wanted.back().first).second) {
+            return UsageError(kAssign, "port '" + wanted.back().first +
+                                           "' is given twice; give each port one pin");
+        }
+    }
+    return kExitOk;
+}
+
+// Why the wanted assignments cannot be made, or empty.
+std::string CheckWanted(const Plan& plan,
+                        const std::vector<std::pair<std::string, std::string>>& wanted) {
+    const ChipDb& db = plan.model->Db();
+    std::unordered_set<std::string> designPorts;
+    std::vector<std::string> portNames;
+    for (const auto& port : plan.design.ports) {
+        designPorts.insert(port.name);
+        portNames.push_back(port.name);
+    }
+    std::vector<std::string> pinNames;
+    for (const Pin& pin : db.pins) {
+        pinNames.push_back(pin.name);
+    }
+    for (const auto& [port, pin] : wanted) {
+        if (designPorts.count(port) == 0) {
+            return "design " + plan.designPath + " has no port '" + port + "'" +
+                   DidYouMean(port, portNames);
+        }
+        if (plan.model->FindPin(pin) == nullptr) {
+            return "pin '" + pin + "' is not in package " + db.package + " of device " + db.device +
+                   DidYouMean(pin, pinNames);
+        }
+    }
+    return {};
+}
+
+// A pin the user asks for that another port of the design holds: told from the user's
+// side, naming the holder, whichever of the two lines comes first in the file.
+std::string CheckHeld(const Plan& plan, const PcfFile& result,
+                      const std::vector<std::pair<std::string, std::string>>& wanted) {
+    std::unordered_set<std::string> designPorts;
+    for (const auto& port : plan.design.ports) {
+        designPorts.insert(port.name);
+    }
+    std::unordered_map<std::string, std::vector<const PcfLine*>> holders;
+    for (const PcfLine& line : result.Lines()) {
+        if (line.kind == PcfLine::Kind::SetIo && designPorts.count(line.port) != 0) {
+            holders[line.pin].push_back(&line);
+        }
+    }
+    for (const auto& [port, pin] : wanted) {
+        for (const PcfLine* holder : holders[pin]) {
+            if (holder->port != port) {
+                return "pin " + pin + " already holds port '" + holder->port + "' (" +
+                       (holder->number == 0 ? std::string("new line")
+                                            : "line " + std::to_string(holder->number)) +
+                       ")";
+            }
+        }
+    }
+    return {};
+}
+
+// Auto-assignment cannot succeed when the ports outnumber the pins no line names: say so
+// before placing any.
+std::string CheckRoom(const Plan& plan, const PcfFile& pcf) {
+    std::unordered_set<std::string> named;
+    std::unordered_set<std::string> constrained;
+    for (const PcfLine& line : pcf.Lines()) {
+        if (line.kind == PcfLine::Kind::SetIo) {
+            named.insert(line.pin);
+            constrained.insert(line.port);
+        }
+    }
+    std::size_t free = 0;
+    for (const Pin& pin : plan.model->Db().pins) {
+        free += named.count(pin.name) == 0 ? 1 : 0;
+    }
+    std::size_t open = 0;
+    for (const DesignPort& port : plan.design.ports) {
+        open += constrained.count(port.name) == 0 ? 1 : 0;
+    }
+    if (open <= free) {
+        return {};
+    }
+    return Count(open, "port", "ports") + " without a pin but only " +
+           Count(free, "free pin", "free pins") + " in package " + plan.model->Db().package;
+}
+
+// Every port name goes into the file as it is, so it must be one a constraint file can
+// hold; and the written text must mean what the plan says.
+std::string CheckWritable(const PcfFile& result, const std::string& text) {
+    for (const PcfLine& line : result.Lines()) {
+        if (line.kind != PcfLine::Kind::SetIo || line.number != 0) {
+            continue;
+        }
+        for (const std::string* word : {&line.port, &line.pin}) {
+            if (std::string why = PcfWordProblem(*word); !why.empty()) {
+                return "'" + Port::Printable(*word) +
+                       "' cannot be written to a constraint file: " + why;
+            }
+        }
+    }
+    PcfFile back;
+    std::string error;
+    if (!back.Parse(text, result.Source(), error)) {
+        return "the written file would not read back: " + error;
+    }
+    if (PcfAssignments(back) != PcfAssignments(result)) {
+        return "the written file would not read back as the plan (a port or pin name that "
+               "the constraint syntax splits or hides)";
+    }
+    return {};
+}
+
+std::string FirstErrorAndCount(const std::vector<PinProblem>& problems) {
+    std::string first;
+    for (const auto& problem : problems) {
+        if (first.empty() && problem.severity == PinProblem::Severity::Error) {
+            first = problem.message;
+        }
+    }
+    int more = Errors(problems) - 1;
+    return first +
+           (more > 0
+                ? " (and " + Count(static_cast<std::size_t>(more), "more error", "more errors") +
+                      "; venlomer pins check lists them)"
+                : "");
+}
+
+int RunAssign(const ParsedArgs& args) {
+    std::vector<std::pair<std::string, std::string>> wanted;
+    if (int status = ReadAssignments(args, wanted); status != kExitOk) {
+        return status;
     }
     std::vector<std::string> unassign = args.Values("--unassign");
     bool autoAssign = args.Has("--auto");
@@ -177,22 +338,11 @@ int RunAssign(const ParsedArgs& args) {
     if (int status = Load(kAssign, args, true, plan); status != kExitOk) {
         return status;
     }
-    const ChipDb& db = plan.model->Db();
-    std::set<std::string> designPorts;
-    for (const auto& port : plan.design.ports) {
-        designPorts.insert(port.name);
-    }
     auto refuse = [&](const std::string& why) {
         return Refused(kAssign, why + "; " + plan.pcfPath + " left untouched");
     };
-    for (const auto& [port, pin] : wanted) {
-        if (designPorts.count(port) == 0) {
-            return refuse("design " + plan.designPath + " has no port '" + port + "'");
-        }
-        if (plan.model->FindPin(pin) == nullptr) {
-            return refuse("pin '" + pin + "' is not in package " + db.package + " of device " +
-                          db.device);
-        }
+    if (std::string why = CheckWanted(plan, wanted); !why.empty()) {
+        return refuse(why);
     }
     PcfFile result = plan.pcf;
     for (const std::string& port : unassign) {
@@ -203,35 +353,36 @@ int RunAssign(const ParsedArgs& args) {
     for (const auto& [port, pin] : wanted) {
         result.Assign(port, pin);
     }
+    if (std::string why = CheckHeld(plan, result, wanted); !why.empty()) {
+        return refuse(why);
+    }
     std::vector<std::pair<std::string, std::string>> given;
     if (autoAssign) {
-        given = AutoAssign(db, plan.design, result);
-    }
-
-    auto problems = CheckPins(db, plan.design, plan.designPath, result, false);
-    if (HasErrors(problems)) {
-        // One line: the first error, which names its file and line.
-        std::string first;
-        for (const auto& problem : problems) {
-            if (first.empty() && problem.severity == PinProblem::Severity::Error) {
-                first = problem.message;
-            }
+        if (std::string why = CheckRoom(plan, result); !why.empty()) {
+            return refuse(why);
         }
-        int more = Errors(problems) - 1;
-        return refuse(first + (more > 0 ? " (and " +
-                                              Count(static_cast<std::size_t>(more), "more error",
-                                                    "more errors") +
-                                              "; venlomer pins check lists them)"
-                                        : ""));
+        given = AutoAssign(plan.model->Db(), plan.design, result);
+    }
+    // A plan being built port by port has ports still to place; with --auto every port
+    // has a pin, so an unconstrained one is the error nextpnr-ice40 would make it.
+    CheckOptions reading = ReadingOf(args);
+    reading.allowUnconstrained = reading.allowUnconstrained || !autoAssign;
+    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, result, reading);
+    if (HasErrors(problems)) {
+        return refuse(FirstErrorAndCount(problems));
+    }
+    std::string text = result.Text();
+    if (std::string why = CheckWritable(result, text); !why.empty()) {
+        return refuse(why);
     }
     PrintDevice(plan);
     for (const std::string& port : unassign) {
-        std::printf("  %s: unassigned\n", port.c_str());
+        std::printf("  %s: unassigned\n", Port::Printable(port).c_str());
     }
     auto describe = [&](const std::string& port, const std::string& pin) {
         DeviceHolder* holder = plan.model->FindPin(pin);
-        std::printf("  %s -> %s (bank %d%s)\n", port.c_str(), pin.c_str(),
-                    plan.model->PinOf(holder).bank,
+        std::printf("  %s -> %s (bank %d%s)\n", Port::Printable(port).c_str(),
+                    Port::Printable(pin).c_str(), plan.model->PinOf(holder).bank,
                     plan.model->IsGlobalBufferPin(holder) ? ", global buffer" : "");
     };
     for (const auto& [port, pin] : wanted) {
@@ -241,7 +392,6 @@ int RunAssign(const ParsedArgs& args) {
         describe(port, pin);
     }
     PrintProblems(problems);
-    std::string text = result.Text();
     if (plan.pcfExisted && text == plan.pcf.Text()) {
         std::printf("%s unchanged\n", plan.pcfPath.c_str());
         return kExitOk;
@@ -296,7 +446,7 @@ int RunShow(const ParsedArgs& args) {
             return status;
         }
     }
-    auto problems = CheckPins(model.Db(), plan.design, plan.designPath, plan.pcf, false);
+    auto problems = CheckPins(model.Db(), plan.design, plan.designPath, plan.pcf, ReadingOf(args));
     PrintDevice(plan);
 
     auto pinIndex = [&](const std::string& pin) {
@@ -370,6 +520,9 @@ std::vector<OptionSyntax> PlanOptions() {
     std::vector<OptionSyntax> options = {
         {"--design", "D.json", "the yosys netlist (synth_ice40 ... -json D.json)"},
         {"--pcf", "P.pcf", "the pin constraint file"},
+        {"--strict", "", "read the file as an exact list: every line names a port of the design"},
+        {"--allow-unconstrained", "",
+         "a port without a pin is a warning (nextpnr-ice40's --pcf-allow-unconstrained)"},
     };
     for (const OptionSyntax& option : DeviceOptionSyntax()) {
         options.push_back(option);
@@ -380,8 +533,12 @@ std::vector<OptionSyntax> PlanOptions() {
 const char kDeviceDetails[] =
     "Without --chipdb or --device, chipdb-8k.txt (package ct256) is taken from\n"
     "/usr/share/fpga-icestorm/chipdb (or the folder in VENLOMER_CHIPDB_DIR), else the\n"
-    "bundled demo device. --device 1k means chipdb-1k.txt there (package tq144 unless\n"
-    "--package says otherwise).\n"
+    "bundled demo device. --device takes nextpnr-ice40's part names (hx1k, hx8k, lp384,\n"
+    "lp1k, lp4k, lp8k, hx4k, up5k, up3k, u4k, u1k, u2k) with nextpnr's default package,\n"
+    "or a chip database's name: --device 1k means chipdb-1k.txt there (package tq144\n"
+    "unless --package says otherwise).\n"
+    "Lines for ports the design lacks are kept with a warning (none with -nowarn or\n"
+    "--warn-no-port) and hold no pin; a design port without a pin is an error.\n"
     "Exit status: 0 success, 1 refused or problems found, 2 bad usage.\n";
 
 } // namespace
@@ -389,7 +546,7 @@ const char kDeviceDetails[] =
 const Command& PinsCheckCommand() {
     static const Command command = [] {
         auto options = PlanOptions();
-        options.push_back({"--strict", "", "a port left without a pin is an error"});
+
         return Command{{kCheck, "", "check a design's pin constraints against the device", options,
                         0, 0,
                         std::string("Prints a table of the design's ports with pin, bank and "

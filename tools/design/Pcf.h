@@ -18,6 +18,7 @@
 #include <cstddef>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace VnTool {
@@ -26,15 +27,25 @@ struct PcfLine {
     enum class Kind { Blank, Comment, SetIo, Other };
     Kind kind = Kind::Blank;
     std::string text;               ///< the line without its end
-    std::string end;                ///< "\n", "\r\n" or "" for a last line without one
+    std::string end;                ///< the carriage returns and line feed that end it: "\n",
+                                    ///< "\r\n", "\r\r\n"; what is left for a last line
+                                    ///< without a line feed ("" or "\r")
     std::size_t number = 0;         ///< 1-based line in the file it came from; 0 for new lines
     std::string command;            ///< the first word of a command line
     std::string port;               ///< set_io only
     std::string pin;                ///< set_io only
     std::size_t pinAt = 0;          ///< where `pin` starts in `text`
-    bool noWarn = false;            ///< set_io -nowarn
+    bool noWarn = false;            ///< set_io -nowarn or --warn-no-port: the port may be absent
+    std::string pullupResistor;     ///< set_io -pullup_resistor's value, or empty
     std::vector<std::string> notes; ///< what nextpnr-ice40 would warn about on this line
 };
+
+/// Why `name` cannot stand as a port or pin word of a set_io line (nextpnr-ice40 would
+/// read it as something else), or empty when it can.
+std::string PcfWordProblem(std::string_view name);
+
+/// The (port, pin) of every set_io line, in file order: what a file means to the placer.
+std::vector<std::pair<std::string, std::string>> PcfAssignments(const class PcfFile& pcf);
 
 class PcfFile {
 public:
@@ -59,6 +70,10 @@ public:
     void Assign(const std::string& port, const std::string& pin);
     /// Drops every set_io line of `port`. Returns the number dropped.
     int Unassign(const std::string& port);
+
+    /// Appends one set_io line per (port, pin), for ports that have no line yet; one
+    /// pass however many there are, where Assign looks through the file for each.
+    void AppendAll(const std::vector<std::pair<std::string, std::string>>& assignments);
 
 private:
     std::string m_source;

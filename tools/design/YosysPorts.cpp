@@ -5,10 +5,12 @@
 
 #include <nlohmann/json.hpp>
 
+#include <climits>
 #include <cstddef>
 #include <cstdint>
 #include <fstream>
 #include <iterator>
+#include <unordered_map>
 #include <unordered_set>
 #include <utility>
 
@@ -92,6 +94,7 @@ enum class Role {
     PortBits,
     Cells,
     Cell,
+    CellParameters,
     Connections,
     ClockBits,
     Ignored
@@ -118,7 +121,43 @@ struct Module {
     bool blackbox = false;
     std::vector<RawPort> ports;
     std::unordered_set<long long> clockBits; // net bits that reach a clock input
+    struct PadBit {
+        PadUse use = PadUse::Plain;
+        int index = -1;
+        std::string cell;
+    };
+    std::unordered_map<long long, PadBit> padBits; // net bits wired to a pad by a cell
+    int padPlls = 0;
+    int twoOutputPlls = 0;
+    bool ledDriver = false;
 };
+
+// The connection of a cell that is wired to a package pad, and what that asks of the pad.
+struct PadConnection {
+    const char* type;
+    const char* connection;
+    PadUse use;
+};
+constexpr PadConnection kPadConnections[] = {
+    {"SB_IO", "PACKAGE_PIN", PadUse::Plain},
+    {"SB_IO_OD", "PACKAGEPIN", PadUse::Plain},
+    {"SB_GB_IO", "PACKAGE_PIN", PadUse::GlobalBuffer},
+    {"SB_PLL40_PAD", "PACKAGEPIN", PadUse::PllInput},
+    {"SB_PLL40_2_PAD", "PACKAGEPIN", PadUse::PllInput},
+    {"SB_PLL40_2F_PAD", "PACKAGEPIN", PadUse::PllInput},
+    {"SB_LVDS_INPUT", "PACKAGE_PIN", PadUse::Differential},
+    {"SB_RGBA_DRV", "RGB0", PadUse::LedDriver},
+    {"SB_RGBA_DRV", "RGB1", PadUse::LedDriver},
+    {"SB_RGBA_DRV", "RGB2", PadUse::LedDriver},
+    {"SB_RGB_DRV", "RGB0", PadUse::LedDriver},
+    {"SB_RGB_DRV", "RGB1", PadUse::LedDriver},
+    {"SB_RGB_DRV", "RGB2", PadUse::LedDriver},
+};
+
+bool IsPadConnectionName(const std::string& name) {
+    return name == "PACKAGE_PIN" || name == "PACKAGEPIN" || name == "RGB0" || name == "RGB1" ||
+           name == "RGB2";
+}
 
 // The connection of a cell that is its clock, by cell type; null for cells without one.
 const char* ClockConnection(const std::string& type) {
@@ -159,8 +198,11 @@ public:
     bool boolean(bool) override { return Scalar(); }
     bool number_integer(number_integer_t value) override { return Number(value); }
     bool number_unsigned(number_unsigned_t value) override {
-        return Number(
-            value > static_cast<number_unsigned_t>(INT64_MAX) ? -1 : static_cast<long long>(value));
+        // Beyond any net or index: kept as the largest value, which every later check
+        // refuses, rather than as -1, which would read as a constant bit or offset -1.
+        return Number(value > static_cast<number_unsigned_t>(INT64_MAX)
+                          ? INT64_MAX
+                          : static_cast<long long>(value));
     }
     bool number_float(number_float_t, const string_t&) override { return Scalar(); }
     bool binary(binary_t&) override { return Scalar(); }
@@ -191,6 +233,11 @@ public:
         case Role::Cell:
             if (frame.key == "type") {
                 m_cellType = value;
+            }
+            return true;
+        case Role::CellParameters:
+            if (frame.key == "IO_STANDARD") {
+                m_cellIoStandard = value;
             }
             return true;
         default:
@@ -387,16 +434,19 @@ private:
             if (!array) {
                 role = Role::Cell;
                 m_cellType.clear();
+                m_cellIoStandard.clear();
                 m_cellBits.clear();
             }
             break;
         case Role::Cell:
             if (key == "connections" && !array) {
                 role = Role::Connections;
+            } else if (key == "parameters" && !array) {
+                role = Role::CellParameters;
             }
             break;
         case Role::Connections:
-            if (array && IsClockConnectionName(key)) {
+            if (array && (IsClockConnectionName(key) || IsPadConnectionName(key))) {
                 role = Role::ClockBits;
             }
             break;
@@ -428,13 +478,38 @@ private:
     }
 
     void FinishCell() {
+        Module& module = m_modules.back();
         const char* clock = ClockConnection(m_cellType);
-        if (clock == nullptr) {
-            return;
-        }
         for (const auto& [name, bit] : m_cellBits) {
-            if (name == clock) {
-                m_modules.back().clockBits.insert(bit);
+            if (clock != nullptr && name == clock) {
+                module.clockBits.insert(bit);
+            }
+        }
+        FinishPadCell(module);
+    }
+
+    void FinishPadCell(Module& module) {
+        bool pll = m_cellType.rfind("SB_PLL40_", 0) == 0;
+        module.padPlls += pll && m_cellType.size() > 4 &&
+                                  m_cellType.compare(m_cellType.size() - 4, 4, "_PAD") == 0
+                              ? 1
+                              : 0;
+        module.twoOutputPlls += pll && m_cellType.find("_2") != std::string::npos ? 1 : 0;
+        module.ledDriver =
+            module.ledDriver || m_cellType == "SB_RGBA_DRV" || m_cellType == "SB_RGB_DRV";
+        for (const PadConnection& pad : kPadConnections) {
+            if (m_cellType != pad.type) {
+                continue;
+            }
+            PadUse use = pad.use;
+            if (use == PadUse::Plain && m_cellIoStandard == "SB_LVDS_INPUT") {
+                use = PadUse::Differential;
+            }
+            for (const auto& [name, bit] : m_cellBits) {
+                if (name == pad.connection && bit >= 0) {
+                    int index = use == PadUse::LedDriver ? name[3] - '0' : -1;
+                    module.padBits[bit] = {use, index, m_cellType};
+                }
             }
         }
     }
@@ -445,7 +520,8 @@ private:
     std::vector<Module> m_modules;
     bool m_sawModules = false;
     std::string m_cellType;
-    std::vector<std::pair<std::string, long long>> m_cellBits; // clock-like connections
+    std::string m_cellIoStandard;
+    std::vector<std::pair<std::string, long long>> m_cellBits; // clock and pad connections
     std::string m_error;
 };
 
@@ -514,7 +590,18 @@ bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, s
         return false;
     }
     design.top = top->name;
+    design.padPlls = top->padPlls;
+    design.twoOutputPlls = top->twoOutputPlls;
+    design.ledDriver = top->ledDriver;
     for (const RawPort& raw : top->ports) {
+        // The bits are named by index: an index that does not fit an int cannot be named.
+        const long long last = static_cast<long long>(raw.bits.size()) - 1;
+        if (raw.offset < INT_MIN || raw.offset > INT_MAX || raw.offset > INT_MAX - last) {
+            error = std::string(source) + ":" + std::to_string(raw.line) + ": port \"" + raw.name +
+                    "\" has bit offset " + std::to_string(raw.offset) +
+                    ", beyond the indices a constraint can name";
+            return false;
+        }
         PortDirection direction = raw.direction == "input"    ? PortDirection::Input
                                   : raw.direction == "output" ? PortDirection::Output
                                                               : PortDirection::Inout;
@@ -534,6 +621,11 @@ bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, s
             }
             long long net = raw.bits[static_cast<std::size_t>(i)];
             port.clock = net >= 0 && top->clockBits.count(net) != 0;
+            if (auto pad = top->padBits.find(net); net >= 0 && pad != top->padBits.end()) {
+                port.padUse = pad->second.use;
+                port.padIndex = pad->second.index;
+                port.padCell = pad->second.cell;
+            }
             design.ports.push_back(std::move(port));
         }
     }

@@ -2,6 +2,7 @@
 #include "DeviceOptions.h"
 
 #include "Port/SearchPath.h"
+#include "Suggest.h"
 
 #include <cstdlib>
 #include <filesystem>
@@ -28,6 +29,38 @@ std::string DefaultPackage(const std::string& device) {
     return "";
 }
 
+// The chip-database names of the folder, for "did you mean".
+std::vector<std::string> KnownDeviceNames() {
+    std::vector<std::string> names;
+    for (const PartInfo& part : Parts()) {
+        names.emplace_back(part.part);
+    }
+    std::error_code ec;
+    for (const auto& entry : fs::directory_iterator(ChipDbFolder(), ec)) {
+        std::string file = entry.path().filename().string();
+        if (file.rfind("chipdb-", 0) == 0 && file.size() > 11 &&
+            file.compare(file.size() - 4, 4, ".txt") == 0) {
+            names.push_back(file.substr(7, file.size() - 11));
+        }
+    }
+    return names;
+}
+
+// A 4k part's packages are listed in the 8k file with ":4k" after the name; people and
+// nextpnr-ice40 call them by the plain name.
+std::string PartPackage(const PartInfo& part, const std::string& package) {
+    std::string suffix = part.packageSuffix;
+    if (package.empty()) {
+        return std::string(part.defaultPackage) + suffix;
+    }
+    if (suffix.empty() ||
+        (package.size() > suffix.size() &&
+         package.compare(package.size() - suffix.size(), suffix.size(), suffix) == 0)) {
+        return package;
+    }
+    return package + suffix;
+}
+
 bool PlainName(const std::string& name) {
     if (name.empty() || name == "." || name == "..") {
         return false;
@@ -41,6 +74,27 @@ bool PlainName(const std::string& name) {
 }
 
 } // namespace
+
+const std::vector<PartInfo>& Parts() {
+    static const std::vector<PartInfo> parts = {
+        {"lp384", "384", "qn32", "", false},   {"lp1k", "1k", "tq144", "", false},
+        {"lp4k", "8k", "tq144", ":4k", false}, {"lp8k", "8k", "ct256", "", false},
+        {"hx1k", "1k", "tq144", "", false},    {"hx4k", "8k", "tq144", ":4k", false},
+        {"hx8k", "8k", "ct256", "", false},    {"up3k", "5k", "sg48", "", true},
+        {"up5k", "5k", "sg48", "", true},      {"u1k", "u4k", "sg48", "", false},
+        {"u2k", "u4k", "sg48", "", false},     {"u4k", "u4k", "sg48", "", false},
+    };
+    return parts;
+}
+
+const PartInfo* FindPart(const std::string& name) {
+    for (const PartInfo& part : Parts()) {
+        if (name == part.part) {
+            return &part;
+        }
+    }
+    return nullptr;
+}
 
 std::string ChipDbFolder() {
     const char* folder = std::getenv("VENLOMER_CHIPDB_DIR");
@@ -66,14 +120,23 @@ DeviceResolution ResolveDevice(const DeviceRequest& request, DeviceSource& sourc
                     "\"; use --chipdb FILE for a file";
             return DeviceResolution::BadUsage;
         }
-        fs::path file = fs::path(ChipDbFolder()) / ("chipdb-" + request.device + ".txt");
+        // "u4k" is a part and a chip database alike, and both mean the same file.
+        const PartInfo* part = FindPart(request.device);
+        std::string chipDbName = part != nullptr ? part->chipDb : request.device;
+        fs::path file = fs::path(ChipDbFolder()) / ("chipdb-" + chipDbName + ".txt");
         if (!fs::is_regular_file(file, ec)) {
-            error = "no chip database for device " + request.device + ": " + file.string() +
-                    " is missing (install fpga-icestorm-chipdb, or use --chipdb FILE)";
+            error =
+                "no chip database for device " + request.device + ": " + file.string() +
+                " is missing" +
+                (part != nullptr ? std::string() : DidYouMean(request.device, KnownDeviceNames())) +
+                " (install fpga-icestorm-chipdb, or use --chipdb FILE)";
             return DeviceResolution::Missing;
         }
         source.chipDb = file.string();
-        if (source.package.empty()) {
+        if (part != nullptr) {
+            source.part = part->part;
+            source.package = PartPackage(*part, source.package);
+        } else if (source.package.empty()) {
             source.package = DefaultPackage(request.device);
         }
         return DeviceResolution::Ok;

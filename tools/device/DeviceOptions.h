@@ -5,7 +5,8 @@
 // the same by them:
 //
 //   --chipdb FILE   that chip database ("-" for standard input)
-//   --device NAME   chipdb-NAME.txt of the chip-database folder
+//   --device NAME   a part as nextpnr-ice40 names it (hx8k, up5k, ...), or
+//                   chipdb-NAME.txt of the chip-database folder (8k, 5k, lm4k, ...)
 //   --package NAME  the package whose pins are read
 //
 // With neither --chipdb nor --device the 8k device in ct256 is opened from the
@@ -23,6 +24,7 @@
 
 #include <filesystem>
 #include <string>
+#include <vector>
 
 namespace VnTool {
 
@@ -36,11 +38,28 @@ struct DeviceRequest {
     std::string package; ///< --package
 };
 
+/// A part as nextpnr-ice40 names it, the chip database that describes it and the package
+/// nextpnr takes when none is given.
+struct PartInfo {
+    const char* part;           ///< "hx8k"
+    const char* chipDb;         ///< the NAME of chipdb-NAME.txt: "8k"
+    const char* defaultPackage; ///< "ct256"
+    const char* packageSuffix;  ///< ":4k" when the part's packages are listed so, else ""
+    bool ultraPlus;             ///< takes -pullup_resistor and has the LED driver
+};
+
+/// The parts nextpnr-ice40 takes, in the order of its --help.
+const std::vector<PartInfo>& Parts();
+
+/// The part named `name`, or null.
+const PartInfo* FindPart(const std::string& name);
+
 /// The file and package to read.
 struct DeviceSource {
     std::string chipDb;
-    std::string package; ///< empty: the first package of the file
-    std::string note;    ///< why the device is not the one the user may expect; else empty
+    std::string package;   ///< empty: the first package of the file
+    std::string note;      ///< why the device is not the one the user may expect; else empty
+    std::string part = {}; ///< the nextpnr-ice40 part asked for; empty for a chip-database name
 };
 
 enum class DeviceResolution {
