@@ -1,21 +1,20 @@
 //===-- tools/commands/EditCommand.cpp - venlomer edit: the editor in a browser ---===//
 //
-// Options, the recovery file's offer, signals and the autosave: everything around the
+// Options, the lock, the recovery file's offer and signals: everything around the
 // engine and the server that a command needs and a test does not.
 //
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
+#include "EditLock.h"
 #include "Editor.h"
 #include "Server.h"
 
 #include "DeviceOptions.h"
 
-#include <condition_variable>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
-#include <mutex>
 #include <pthread.h>
 #include <thread>
 
@@ -25,9 +24,6 @@ namespace {
 
 const char kCommand[] = "edit";
 
-// How often unsaved work goes to the recovery file.
-constexpr auto kRecoveryInterval = std::chrono::seconds(2);
-
 int Run(const ParsedArgs& args) {
     EditorFiles files;
     files.design = args.Value("--design");
@@ -35,20 +31,15 @@ int Run(const ParsedArgs& args) {
     if (files.design.empty() || files.pcf.empty()) {
         return UsageError(kCommand, "--design and --pcf are required");
     }
-    std::string error;
-    DeviceRequest request{args.Value("--chipdb"), args.Value("--device"), args.Value("--package")};
-    switch (ResolveDevice(request, files.device, error)) {
-    case DeviceResolution::Ok:
-        break;
-    case DeviceResolution::BadUsage:
-        return UsageError(kCommand, error);
-    case DeviceResolution::Missing:
-        return Refused(kCommand, error);
-    }
-    if (files.device.chipDb == "-") {
+    if (args.Value("--chipdb") == "-") {
         return UsageError(kCommand, "the editor reads its chip database from a file, not "
                                     "standard input");
     }
+    std::unique_ptr<DeviceModel> device;
+    if (int status = OpenDevice(kCommand, args, files.device, device); status != kExitOk) {
+        return status;
+    }
+    std::string error;
     int port = 0;
     if (args.Has("--port")) {
         std::string text = args.Value("--port");
@@ -72,8 +63,18 @@ int Run(const ParsedArgs& args) {
         std::printf("Note: %s\n", files.device.note.c_str());
     }
     Editor editor;
-    if (!editor.Open(files, error)) {
+    if (!editor.Open(files, std::move(device), error)) {
         return Refused(kCommand, error);
+    }
+    // The lock comes before the recovery file: that file is the running editor's work.
+    EditorServer server(editor);
+    EditLock lock;
+    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
+        !server.Bind(port, error) || !lock.Take(files.pcf, server.Port(), error)) {
+        return Refused(kCommand, error);
+    }
+    if (lock.TookOverStale()) {
+        std::printf("Took over %s: the editor that left it is gone\n", lock.Path().c_str());
     }
     if (editor.HasRecovery()) {
         if (args.Has("--recover")) {
@@ -99,11 +100,6 @@ int Run(const ParsedArgs& args) {
                     editor.RecoveryPath().c_str());
     }
 
-    EditorServer server(editor);
-    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
-        !server.Bind(port, error)) {
-        return Refused(kCommand, error);
-    }
 
     // Signals are taken by one thread with sigwait, so no handler runs inside the server
     // or the library; every thread started below inherits the mask.
@@ -113,20 +109,7 @@ int Run(const ParsedArgs& args) {
     sigaddset(&stopSignals, SIGTERM);
     pthread_sigmask(SIG_BLOCK, &stopSignals, nullptr);
 
-    std::mutex lock;
-    std::condition_variable wake;
-    bool stopping = false;
     std::thread serving([&] { server.Run(); });
-    std::thread autosave([&] {
-        std::unique_lock<std::mutex> hold(lock);
-        while (!wake.wait_for(hold, kRecoveryInterval, [&] { return stopping; })) {
-            std::string why;
-            if (!editor.WriteRecovery(why)) {
-                std::fprintf(stderr, "venlomer edit: the recovery file was not written: %s\n",
-                             why.c_str());
-            }
-        }
-    });
     std::printf("Editing %s with %s on %s\nOpen %s in a browser; Ctrl-C stops.\n",
                 files.pcf.c_str(), files.design.c_str(), files.device.chipDb.c_str(),
                 server.Url().c_str());
@@ -136,12 +119,6 @@ int Run(const ParsedArgs& args) {
     sigwait(&stopSignals, &signal);
     server.Stop();
     serving.join();
-    {
-        std::lock_guard<std::mutex> hold(lock);
-        stopping = true;
-    }
-    wake.notify_all();
-    autosave.join();
     if (!editor.WriteRecovery(error)) {
         return Refused(kCommand, "the unsaved changes were not kept: " + error);
     }
@@ -174,9 +151,11 @@ const Command& EditCommand() {
          0,
          0,
          "The server listens on 127.0.0.1 only and prints the address to open. Unsaved\n"
-         "changes go to FILE.recovery beside the constraint file every few seconds and on\n"
-         "stop (Ctrl-C or SIGTERM); a later start refuses to run over them until told\n"
-         "--recover or --discard-recovery.\n"
+         "changes go to FILE.recovery beside the constraint file after every change; a\n"
+         "later start refuses to run over them until told --recover or\n"
+         "--discard-recovery. One editor per constraint file: a second is refused with\n"
+         "the first one's pid and port (FILE.lock); a lock left by a killed editor is\n"
+         "taken over. Save refuses to write over a file changed on disk meanwhile.\n"
          "Example: venlomer edit --design top.json --pcf top.pcf --device 8k\n"},
         Run};
     return command;
