@@ -672,6 +672,7 @@ struct Editor::State {
     static const std::map<std::string, std::pair<bool, Route>>& Routes() {
         // path -> (whether it is a POST, what serves it)
         static const std::map<std::string, std::pair<bool, Route>> routes{
+            {"/api/ping", {false, &State::GetPing}},
             {"/api/state", {false, &State::GetState}},
             {"/api/device", {false, &State::GetDevice}},
             {"/api/tree", {false, &State::GetTree}},
@@ -689,6 +690,7 @@ struct Editor::State {
         return routes;
     }
 
+    json GetPing(const json&) { return {{"revision", plan.Revision()}}; }
     json GetState(const json&) { return StateJson(); }
     json GetDevice(const json&) { return DeviceJson(); }
     json GetTree(const json&) { return TreeJson(); }

@@ -17,6 +17,7 @@
 //                         errors, problemPins, problemPorts.
 //                         The marks: revision, selected ids, highlighted pins {pin:
 //                         colour}, matches (ids of the last search), matchColor.
+//   GET  /api/ping        {revision}: cheap, for the page to see that the server is there.
 //   GET  /api/device      the device once: name, package, width, height, tiles
 //                         [{name,x,y,type,site,color}], pins [{id,name,bank,x,y,block,
 //                         gbuf,color}], bank colours, selected-path colours.

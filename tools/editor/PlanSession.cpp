@@ -103,13 +103,14 @@ bool PlanSession::Open(const ChipDb& db, const Design& design, const std::string
         return false;
     }
     m_recoveredText = m_diskText;
+    m_text = m_pcf.Text();
     m_problems = CheckPins(db, design, designPath, m_pcf, false);
     m_pinOfPort = PinsOf(m_pcf);
     return true;
 }
 
 bool PlanSession::Unsaved() const {
-    return m_pcf.Text() != m_diskText;
+    return m_text != m_diskText;
 }
 
 std::size_t PlanSession::HistoryBytes() const {
@@ -153,6 +154,7 @@ PlanSession::Step PlanSession::Diff(const PcfFile& before, const PcfFile& after)
 
 void PlanSession::Adopt(PcfFile next, std::vector<PinProblem> problems) {
     m_pcf = std::move(next);
+    m_text = m_pcf.Text();
     m_problems = std::move(problems);
     m_pinOfPort = PinsOf(m_pcf);
     ++m_revision;
@@ -244,7 +246,7 @@ void PlanSession::Save(const std::vector<std::string>& inputs) {
         refusal.changedOnDisk = true;
         throw refusal;
     }
-    const std::string text = m_pcf.Text();
+    const std::string& text = m_text;
     if (!Port::WriteFileSafely(m_pcfPath, text, error, inputs)) {
         throw PlanRefusal{500, error};
     }
@@ -320,7 +322,7 @@ void PlanSession::TakeDisk(bool reapply) {
 }
 
 bool PlanSession::WriteRecovery(std::string& error) {
-    std::string text = m_pcf.Text();
+    const std::string& text = m_text;
     if (text == m_diskText) {
         // Nothing unsaved: nothing is left to recover.
         if (m_ownsRecovery) {
@@ -337,7 +339,7 @@ bool PlanSession::WriteRecovery(std::string& error) {
     if (!Port::WriteFileSafely(RecoveryPath(), text, error, {m_designPath, m_pcfPath})) {
         return false;
     }
-    m_recoveredText = std::move(text);
+    m_recoveredText = text;
     m_ownsRecovery = true;
     return true;
 }
@@ -358,7 +360,7 @@ bool PlanSession::LoadRecovery(std::string& error) {
     m_redo.clear();
     auto problems = CheckPins(*m_db, *m_design, m_designPath, renamed, false);
     Adopt(std::move(renamed), std::move(problems));
-    m_recoveredText = m_pcf.Text();
+    m_recoveredText = m_text;
     m_ownsRecovery = true;
     return true;
 }

@@ -98,6 +98,7 @@ private:
     std::string m_designPath;
     std::string m_pcfPath;
     PcfFile m_pcf;
+    std::string m_text; // m_pcf.Text(), kept: every answer asks whether it is saved
     std::vector<PinProblem> m_problems;
     std::map<std::string, std::string> m_pinOfPort;
     std::vector<Step> m_undo;

@@ -195,8 +195,13 @@ std::optional<Response> BodyLength(const Request& request, const ServerLimits& l
     return std::nullopt;
 }
 
+// A refused request's sender may still be sending: its bytes are read and dropped for a
+// while after the answer, so that the answer is not lost to a reset.
+constexpr std::size_t kMaxDrained = std::size_t{8} << 20;
+constexpr auto kDrainTime = std::chrono::milliseconds(1000);
+
 struct Connection {
-    enum class Phase { Head, Body, Closing };
+    enum class Phase { Head, Body, Closing, Draining };
     int fd = -1;
     Phase phase = Phase::Head;
     std::string in;
@@ -205,6 +210,7 @@ struct Connection {
     std::size_t bodyLength = 0;
     Clock::time_point deadline;
     bool started = false; // a byte of the current request has come
+    std::size_t drained = 0;
 };
 
 } // namespace
@@ -385,6 +391,10 @@ struct EditorServer::Imp {
         if (got == 0 || (got < 0 && errno != EAGAIN && errno != EINTR)) {
             return false;
         }
+        if (c.phase == Connection::Phase::Draining) {
+            c.drained += got > 0 ? static_cast<std::size_t>(got) : 0;
+            return got < 0 || c.drained < kMaxDrained;
+        }
         if (got > 0 && c.phase != Connection::Phase::Closing) {
             c.in.append(buffer, static_cast<std::size_t>(got));
             Advance(c);
@@ -399,7 +409,10 @@ struct EditorServer::Imp {
         }
         c.out.erase(0, static_cast<std::size_t>(sent));
         if (c.out.empty() && c.phase == Connection::Phase::Closing) {
-            return false;
+            ::shutdown(c.fd, SHUT_WR);
+            c.phase = Connection::Phase::Draining;
+            c.deadline = Clock::now() + kDrainTime;
+            return true;
         }
         Advance(c); // requests held back while answers were pending
         return true;
@@ -407,7 +420,8 @@ struct EditorServer::Imp {
 
     // A connection past its deadline: a request that was coming gets 408, an idle one ends.
     void Expire(Connection& c) {
-        if (c.phase == Connection::Phase::Closing || (!c.started && c.phase == Connection::Phase::Head)) {
+        if (c.phase == Connection::Phase::Closing || c.phase == Connection::Phase::Draining ||
+            (!c.started && c.phase == Connection::Phase::Head)) {
             c.phase = Connection::Phase::Closing;
             c.out.clear();
             return;
