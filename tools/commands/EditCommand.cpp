@@ -24,83 +24,54 @@ namespace {
 
 const char kCommand[] = "edit";
 
-int Run(const ParsedArgs& args) {
-    EditorFiles files;
-    files.design = args.Value("--design");
-    files.pcf = args.Value("--pcf");
-    if (files.design.empty() || files.pcf.empty()) {
-        return UsageError(kCommand, "--design and --pcf are required");
+// The port to listen on from --port; -1 after a usage error has been reported.
+int PortOption(const ParsedArgs& args) {
+    if (!args.Has("--port")) {
+        return 0;
     }
-    if (args.Value("--chipdb") == "-") {
-        return UsageError(kCommand, "the editor reads its chip database from a file, not "
-                                    "standard input");
+    std::string text = args.Value("--port");
+    char* end = nullptr;
+    long value = std::strtol(text.c_str(), &end, 10);
+    if (text.empty() || *end != '\0' || value < 0 || value > 65535) {
+        UsageError(kCommand, "--port wants 0..65535, got \"" + text + "\"");
+        return -1;
     }
-    std::unique_ptr<DeviceModel> device;
-    if (int status = OpenDevice(kCommand, args, files.device, device); status != kExitOk) {
-        return status;
-    }
+    return static_cast<int>(value);
+}
+
+// What an earlier session left: loaded, dropped, or a refusal to start over it.
+int TakeRecovery(const ParsedArgs& args, Editor& editor, const std::string& pcf) {
     std::string error;
-    int port = 0;
-    if (args.Has("--port")) {
-        std::string text = args.Value("--port");
-        char* end = nullptr;
-        long value = std::strtol(text.c_str(), &end, 10);
-        if (text.empty() || *end != '\0' || value < 0 || value > 65535) {
-            return UsageError(kCommand, "--port wants 0..65535, got \"" + text + "\"");
-        }
-        port = static_cast<int>(value);
-    }
-    if (args.Has("--recover") && args.Has("--discard-recovery")) {
-        return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
-    }
-
-    std::string page = FindDataFile("editor/index.html");
-    if (page.empty()) {
-        return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
-                                 "VENLOMER_DATA_PATH to the folder that holds it");
-    }
-    if (!files.device.note.empty()) {
-        std::printf("Note: %s\n", files.device.note.c_str());
-    }
-    Editor editor;
-    if (!editor.Open(files, std::move(device), error)) {
-        return Refused(kCommand, error);
-    }
-    // The lock comes before the recovery file: that file is the running editor's work.
-    EditorServer server(editor);
-    EditLock lock;
-    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
-        !server.Bind(port, error) || !lock.Take(files.pcf, server.Port(), error)) {
-        return Refused(kCommand, error);
-    }
-    if (lock.TookOverStale()) {
-        std::printf("Took over %s: the editor that left it is gone\n", lock.Path().c_str());
-    }
-    if (editor.HasRecovery()) {
+    if (!editor.HasRecovery()) {
         if (args.Has("--recover")) {
-            if (!editor.LoadRecovery(error)) {
-                return Refused(kCommand, error);
-            }
-            std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
-                        editor.RecoveryPath().c_str(), files.pcf.c_str());
-        } else if (args.Has("--discard-recovery")) {
-            std::error_code ec;
-            std::filesystem::remove(editor.RecoveryPath(), ec);
-            std::printf("Dropped the unsaved changes of an earlier session (%s)\n",
+            std::printf("No unsaved changes to recover (%s does not exist)\n",
                         editor.RecoveryPath().c_str());
-        } else {
-            // Starting over it would overwrite that work with this session's.
-            return Refused(kCommand, editor.RecoveryPath() +
-                                         " holds unsaved changes of an earlier session: start "
-                                         "with --recover to load them, or --discard-recovery "
-                                         "to drop them");
         }
-    } else if (args.Has("--recover")) {
-        std::printf("No unsaved changes to recover (%s does not exist)\n",
-                    editor.RecoveryPath().c_str());
+        return kExitOk;
     }
+    if (args.Has("--recover")) {
+        if (!editor.LoadRecovery(error)) {
+            return Refused(kCommand, error);
+        }
+        std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
+                    editor.RecoveryPath().c_str(), pcf.c_str());
+        return kExitOk;
+    }
+    if (args.Has("--discard-recovery")) {
+        std::error_code ec;
+        std::filesystem::remove(editor.RecoveryPath(), ec);
+        std::printf("Dropped the unsaved changes of an earlier session (%s)\n",
+                    editor.RecoveryPath().c_str());
+        return kExitOk;
+    }
+    // Starting over it would overwrite that work with this session's.
+    return Refused(kCommand, editor.RecoveryPath() +
+                                 " holds unsaved changes of an earlier session: start with "
+                                 "--recover to load them, or --discard-recovery to drop them");
+}
 
-
+// Serves until SIGINT or SIGTERM, then says where unsaved work is.
+int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
     // Signals are taken by one thread with sigwait, so no handler runs inside the server
     // or the library; every thread started below inherits the mask.
     sigset_t stopSignals;
@@ -119,6 +90,7 @@ int Run(const ParsedArgs& args) {
     sigwait(&stopSignals, &signal);
     server.Stop();
     serving.join();
+    std::string error;
     if (!editor.WriteRecovery(error)) {
         return Refused(kCommand, "the unsaved changes were not kept: " + error);
     }
@@ -129,6 +101,57 @@ int Run(const ParsedArgs& args) {
         std::printf("Stopped; nothing unsaved\n");
     }
     return kExitOk;
+}
+
+int Run(const ParsedArgs& args) {
+    EditorFiles files;
+    files.design = args.Value("--design");
+    files.pcf = args.Value("--pcf");
+    if (files.design.empty() || files.pcf.empty()) {
+        return UsageError(kCommand, "--design and --pcf are required");
+    }
+    if (args.Value("--chipdb") == "-") {
+        return UsageError(kCommand, "the editor reads its chip database from a file, not "
+                                    "standard input");
+    }
+    const int port = PortOption(args);
+    if (port < 0) {
+        return kExitUsage;
+    }
+    if (args.Has("--recover") && args.Has("--discard-recovery")) {
+        return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
+    }
+    std::unique_ptr<DeviceModel> device;
+    if (int status = OpenDevice(kCommand, args, files.device, device); status != kExitOk) {
+        return status;
+    }
+    std::string page = FindDataFile("editor/index.html");
+    if (page.empty()) {
+        return Refused(kCommand, "the editor's page (share/venlomer/editor) was not found; set "
+                                 "VENLOMER_DATA_PATH to the folder that holds it");
+    }
+    if (!files.device.note.empty()) {
+        std::printf("Note: %s\n", files.device.note.c_str());
+    }
+    Editor editor;
+    std::string error;
+    if (!editor.Open(files, std::move(device), error)) {
+        return Refused(kCommand, error);
+    }
+    // The lock comes before the recovery file: that file is the running editor's work.
+    EditorServer server(editor);
+    EditLock lock;
+    if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
+        !server.Bind(port, error) || !lock.Take(files.pcf, server.Port(), error)) {
+        return Refused(kCommand, error);
+    }
+    if (lock.TookOverStale()) {
+        std::printf("Took over %s: the editor that left it is gone\n", lock.Path().c_str());
+    }
+    if (int status = TakeRecovery(args, editor, files.pcf); status != kExitOk) {
+        return status;
+    }
+    return Serve(editor, server, files);
 }
 
 } // namespace
