@@ -130,7 +130,7 @@ TEST_F(Reliability, SaveRefusesAFileChangedOnDiskAndReappliesTheEditsOnTheNewOne
 
     json state = Post("/api/take-disk", {{"reapply", true}});
     EXPECT_EQ(state["saved"], false);
-    EXPECT_EQ(PortPin(state, "clk"), "11");   // theirs
+    EXPECT_EQ(PortPin(state, "clk"), "11");    // theirs
     EXPECT_EQ(PortPin(state, "led[1]"), "10"); // ours
     Post("/api/save", json::object());
     EXPECT_EQ(ReadAll(pcf), theirs + "set_io led[1] 10\n");
@@ -205,8 +205,8 @@ TEST_F(Reliability, UndoHoldsTheChangedLinesNotCopiesOfTheFile) {
     for (int step = 0; step < kSteps; ++step) {
         const std::size_t before = m_editor->HistoryBytes();
         const char* pin = step % 2 == 0 ? "10" : "11";
-        auto reply = m_editor->Handle("POST", "/api/assign",
-                                      json{{"port", "led[1]"}, {"pin", pin}}.dump());
+        auto reply =
+            m_editor->Handle("POST", "/api/assign", json{{"port", "led[1]"}, {"pin", pin}}.dump());
         ASSERT_EQ(reply.status, 200) << reply.body;
         EXPECT_LE(m_editor->HistoryBytes() - before, 1024u) << "step " << step;
     }
@@ -278,15 +278,15 @@ TEST_F(Reliability, MalformedRequestsGetABoundedFourHundredAndTheEditorGoesOn) {
     Post("/api/select", {{"id", "pin:1"}, {"descend", "deep"}}, 400);
     Post("/api/select", {{"id", "pin:1"}, {"mode", 3}}, 400);
     Post("/api/undo", {{"step", "1"}}, 400);
-    json regexp = Post("/api/search",
-                       {{"property", "Name"}, {"value", "led[("}, {"flags", {"regexp"}}}, 400);
+    json regexp =
+        Post("/api/search", {{"property", "Name"}, {"value", "led[("}, {"flags", {"regexp"}}}, 400);
     EXPECT_NE(regexp["error"].get<std::string>().find("no valid regular expression"),
               std::string::npos);
     // A path with control bytes and a long one: valid JSON back, the quote cut short.
-    const std::string raw = Exchange(m_server->Port(), Head(m_server->Port(), "GET",
-                                                            "/api/\x01\x7f" + std::string(3000, 'a')) +
-                                                           "\r\n",
-                                     std::chrono::milliseconds(500));
+    const std::string raw =
+        Exchange(m_server->Port(),
+                 Head(m_server->Port(), "GET", "/api/\x01\x7f" + std::string(3000, 'a')) + "\r\n",
+                 std::chrono::milliseconds(500));
     EXPECT_EQ(StatusOf(raw), 404) << raw.substr(0, 200);
     json answer = BodyOf(raw);
     ASSERT_TRUE(answer.is_object()) << raw.substr(0, 300);
@@ -313,8 +313,8 @@ TEST_F(Reliability, TheBodyAndTheHeadAreBoundedHoweverTheyAreFramed) {
         many += "X-Filler-" + std::to_string(i) + ": 1\r\n";
     }
     EXPECT_EQ(StatusOf(Exchange(port, many + "\r\n")), 431);
-    EXPECT_EQ(StatusOf(Exchange(port, Head(port, "GET", "/api/state") + "X-Long: " +
-                                          std::string(100000, 'x') + "\r\n\r\n")),
+    EXPECT_EQ(StatusOf(Exchange(port, Head(port, "GET", "/api/state") +
+                                          "X-Long: " + std::string(100000, 'x') + "\r\n\r\n")),
               431);
     EXPECT_EQ(StatusOf(Exchange(port, "NONSENSE\r\n\r\n")), 400);
     EXPECT_EQ(Get("/api/state")["ports"].size(), 3u); // and it goes on
@@ -325,8 +325,8 @@ TEST_F(Reliability, AHeadThatComesTooSlowlyIsCutOff) {
     m_limits.headTime = std::chrono::milliseconds(600);
     Start();
     const auto started = Clock::now();
-    const std::string answer = Exchange(m_server->Port(), "GET /api/state HTTP/1.1\r\n",
-                                        std::chrono::milliseconds(5000));
+    const std::string answer =
+        Exchange(m_server->Port(), "GET /api/state HTTP/1.1\r\n", std::chrono::milliseconds(5000));
     const auto took = Clock::now() - started;
     EXPECT_EQ(StatusOf(answer), 408) << answer;
     EXPECT_LT(took, std::chrono::milliseconds(3000));

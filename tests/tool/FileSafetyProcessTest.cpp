@@ -594,8 +594,7 @@ TEST_F(FileSafety, TheTemporaryIsSyncedBeforeItReplacesTheFile) {
     const std::string log = (m_dir / "trace").string();
     const std::string command =
         "cd " + Quote(m_dir.string()) + " && timeout 120 strace -f -o " + Quote(log) +
-        " -e trace=fsync,fdatasync,rename,renameat,renameat2,openat " +
-        Quote(VENLOMER_TOOL_PATH) +
+        " -e trace=fsync,fdatasync,rename,renameat,renameat2,openat " + Quote(VENLOMER_TOOL_PATH) +
         " pins assign --design top.json --pcf top.pcf --chipdb chip.txt --package dq50 b=10"
         " >/dev/null 2>&1";
     ASSERT_EQ(std::system(command.c_str()), 0) << Slurp(log);
@@ -633,8 +632,7 @@ TEST_F(FileSafety, PinsAssignRefusesWhenTheFileChangesBetweenItsReadAndItsWrite)
     WriteBytes(m_dir / "top.pcf", "# board\n");
     const std::string command =
         "cd " + Quote(m_dir.string()) + " && timeout 120 strace -f -o /dev/null -P top.pcf " +
-        "-e trace=openat -e inject=openat:delay_enter=1500000:when=2 " +
-        Quote(VENLOMER_TOOL_PATH) +
+        "-e trace=openat -e inject=openat:delay_enter=1500000:when=2 " + Quote(VENLOMER_TOOL_PATH) +
         " pins assign --design top.json --pcf top.pcf --chipdb chip.txt --package dq50 b=10"
         " >stdout 2>stderr";
     std::thread tool([&] { (void)std::system(command.c_str()); });

@@ -159,7 +159,6 @@ int RunCheck(const ParsedArgs& args) {
 
 // ---- assign ----------------------------------------------------------------------------
 
-
 // Another program (an editor, a hand) may have changed the constraint file while the
 // plan was worked out from it; writing then would drop its lines without a word.
 bool StillAsRead(const Plan& plan, std::string& error) {

@@ -5,8 +5,8 @@
 
 #include "Port/SafeFile.h"
 
-#include <csignal>
 #include <cerrno>
+#include <csignal>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -65,8 +65,8 @@ bool EditLock::Take(const std::string& pcf, int port, std::string& error) {
         long theirPort = 0;
         std::istringstream(held) >> pid >> theirPort;
         if (LiveEditor(pid)) {
-            error = pcf + " is being edited by another venlomer edit (pid " +
-                    std::to_string(pid) + ", http://127.0.0.1:" + std::to_string(theirPort) +
+            error = pcf + " is being edited by another venlomer edit (pid " + std::to_string(pid) +
+                    ", http://127.0.0.1:" + std::to_string(theirPort) +
                     "/); stop it first, or edit there";
             return false;
         }

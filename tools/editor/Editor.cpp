@@ -140,7 +140,7 @@ struct Editor::State {
     std::unique_ptr<PortHolders> ports;
     std::unordered_map<std::string, PortHolder*> portByName;
     Ptr<VnI::ITreeModel> designTree;
-    mutable DevicePalette palette; // remembers whether it fell back; no plan state
+    mutable DevicePalette palette;    // remembers whether it fell back; no plan state
     std::vector<std::string> matches; // ids of the last search
     std::string recoveryError;        // why the last change's recovery was not written
 

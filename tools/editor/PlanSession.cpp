@@ -98,8 +98,7 @@ bool PlanSession::Open(const ChipDb& db, const Design& design, const std::string
     m_design = &design;
     m_designPath = designPath;
     m_pcfPath = pcfPath;
-    if (!ReadDisk(m_diskText, m_diskExisted, error) ||
-        !m_pcf.Parse(m_diskText, m_pcfPath, error)) {
+    if (!ReadDisk(m_diskText, m_diskExisted, error) || !m_pcf.Parse(m_diskText, m_pcfPath, error)) {
         return false;
     }
     m_recoveredText = m_diskText;
@@ -131,7 +130,9 @@ std::size_t PlanSession::HistoryBytes() const {
 PlanSession::Step PlanSession::Diff(const PcfFile& before, const PcfFile& after) {
     const auto& a = before.Lines();
     const auto& b = after.Lines();
-    auto same = [](const PcfLine& x, const PcfLine& y) { return x.text == y.text && x.end == y.end; };
+    auto same = [](const PcfLine& x, const PcfLine& y) {
+        return x.text == y.text && x.end == y.end;
+    };
     std::size_t head = 0;
     while (head < a.size() && head < b.size() && same(a[head], b[head])) {
         ++head;
@@ -192,9 +193,8 @@ void PlanSession::Edit(const std::function<void(PcfFile&)>& change) {
 void PlanSession::Travel(std::vector<Step>& from, std::vector<Step>& to, long step,
                          const char* what) {
     if (step != m_revision) {
-        throw PlanRefusal{409, "stale step " + std::to_string(step) +
-                                   ": the plan is at revision " + std::to_string(m_revision) +
-                                   "; reload to see it"};
+        throw PlanRefusal{409, "stale step " + std::to_string(step) + ": the plan is at revision " +
+                                   std::to_string(m_revision) + "; reload to see it"};
     }
     if (from.empty()) {
         throw PlanRefusal{409, std::string("nothing to ") + what};

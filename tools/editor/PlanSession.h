@@ -83,9 +83,9 @@ public:
 
 private:
     struct Step {
-        std::size_t at = 0;                // first line changed
-        std::vector<std::string> removed;  // lines (with their ends) the change took out
-        std::vector<std::string> added;    // lines it put in their place
+        std::size_t at = 0;               // first line changed
+        std::vector<std::string> removed; // lines (with their ends) the change took out
+        std::vector<std::string> added;   // lines it put in their place
     };
     static Step Diff(const PcfFile& before, const PcfFile& after);
     void Travel(std::vector<Step>& from, std::vector<Step>& to, long step, const char* what);

@@ -42,21 +42,31 @@ constexpr std::size_t kMaxPendingOut = std::size_t{8} << 20;
 
 const char* MimeOf(const std::filesystem::path& path) {
     static const std::map<std::string, const char*> kTypes{
-        {".html", "text/html; charset=utf-8"},     {".css", "text/css; charset=utf-8"},
-        {".js", "text/javascript; charset=utf-8"}, {".mjs", "text/javascript; charset=utf-8"},
-        {".svg", "image/svg+xml"},                 {".png", "image/png"}};
+        {".html", "text/html; charset=utf-8"},
+        {".css", "text/css; charset=utf-8"},
+        {".js", "text/javascript; charset=utf-8"},
+        {".mjs", "text/javascript; charset=utf-8"},
+        {".svg", "image/svg+xml"},
+        {".png", "image/png"}};
     auto it = kTypes.find(path.extension().string());
     return it == kTypes.end() ? nullptr : it->second;
 }
 
 const char* StatusText(int status) {
-    static const std::map<int, const char*> kTexts{
-        {200, "OK"},           {400, "Bad Request"},       {403, "Forbidden"},
-        {404, "Not Found"},    {405, "Method Not Allowed"}, {408, "Request Timeout"},
-        {409, "Conflict"},     {411, "Length Required"},    {413, "Content Too Large"},
-        {415, "Unsupported Media Type"}, {421, "Misdirected Request"},
-        {431, "Request Header Fields Too Large"}, {500, "Internal Server Error"},
-        {501, "Not Implemented"}};
+    static const std::map<int, const char*> kTexts{{200, "OK"},
+                                                   {400, "Bad Request"},
+                                                   {403, "Forbidden"},
+                                                   {404, "Not Found"},
+                                                   {405, "Method Not Allowed"},
+                                                   {408, "Request Timeout"},
+                                                   {409, "Conflict"},
+                                                   {411, "Length Required"},
+                                                   {413, "Content Too Large"},
+                                                   {415, "Unsupported Media Type"},
+                                                   {421, "Misdirected Request"},
+                                                   {431, "Request Header Fields Too Large"},
+                                                   {500, "Internal Server Error"},
+                                                   {501, "Not Implemented"}};
     auto it = kTexts.find(status);
     return it == kTexts.end() ? "Status" : it->second;
 }
@@ -104,8 +114,8 @@ Response Refusal(int status, const std::string& why, bool close = false) {
 }
 
 std::string Serialise(const Response& response) {
-    std::string out = "HTTP/1.1 " + std::to_string(response.status) + " " +
-                      StatusText(response.status) + "\r\n";
+    std::string out =
+        "HTTP/1.1 " + std::to_string(response.status) + " " + StatusText(response.status) + "\r\n";
     out += "Content-Type: " + response.type + "\r\n";
     out += "Content-Length: " + std::to_string(response.body.size()) + "\r\n";
     out += "Cache-Control: no-store\r\nX-Content-Type-Options: nosniff\r\n";
@@ -124,11 +134,11 @@ HeadState ScanHead(const std::string& in, const ServerLimits& limits, std::size_
         end += 4;
         const auto lines = static_cast<std::size_t>(std::count(in.begin(), in.begin() + end, '\n'));
         return end > limits.headBytes || lines > limits.headLines + 2 ? HeadState::TooLarge
-                                                                       : HeadState::Whole;
+                                                                      : HeadState::Whole;
     }
     const auto lines = static_cast<std::size_t>(std::count(in.begin(), in.end(), '\n'));
     return in.size() > limits.headBytes || lines > limits.headLines + 2 ? HeadState::TooLarge
-                                                                         : HeadState::Partial;
+                                                                        : HeadState::Partial;
 }
 
 // The request line and headers; a reason when they are not HTTP/1.x.
@@ -338,9 +348,10 @@ struct EditorServer::Imp {
         case HeadState::Partial:
             return false;
         case HeadState::TooLarge:
-            Answer(c, Refusal(431, "the request's head is over its limit of " +
-                                       std::to_string(limits.headBytes) + " bytes or " +
-                                       std::to_string(limits.headLines) + " lines",
+            Answer(c, Refusal(431,
+                              "the request's head is over its limit of " +
+                                  std::to_string(limits.headBytes) + " bytes or " +
+                                  std::to_string(limits.headLines) + " lines",
                               true));
             return false;
         case HeadState::Whole:
