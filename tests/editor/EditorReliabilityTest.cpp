@@ -201,7 +201,7 @@ TEST_F(Reliability, UndoHoldsTheChangedLinesNotCopiesOfTheFile) {
     std::ofstream(m_dir / "top.pcf") << big;
     Start();
     const std::size_t heapBefore = HeapInUse();
-    constexpr int kSteps = 16;
+    constexpr int kSteps = 8;
     for (int step = 0; step < kSteps; ++step) {
         const std::size_t before = m_editor->HistoryBytes();
         const char* pin = step % 2 == 0 ? "10" : "11";
@@ -210,7 +210,7 @@ TEST_F(Reliability, UndoHoldsTheChangedLinesNotCopiesOfTheFile) {
         ASSERT_EQ(reply.status, 200) << reply.body;
         EXPECT_LE(m_editor->HistoryBytes() - before, 1024u) << "step " << step;
     }
-    // Measured, not counted: whole copies would hold 16 times the file's model.
+    // Measured, not counted: whole copies would hold 8 times the file's model.
     if (heapBefore != 0) {
         EXPECT_LT(HeapInUse() - std::min(HeapInUse(), heapBefore), std::size_t{16} << 20);
     }
@@ -335,6 +335,7 @@ TEST_F(Reliability, AHeadThatComesTooSlowlyIsCutOff) {
 TEST_F(Reliability, ANormalClientIsAnsweredWhileTwoHundredSlowOnesDrip) {
     const int port = m_server->Port();
     std::vector<int> slow;
+    slow.reserve(200);
     for (int i = 0; i < 200; ++i) {
         const int fd = Connect(port);
         ASSERT_GE(fd, 0) << i;

@@ -49,16 +49,17 @@ bool EditLock::Take(const std::string& pcf, int port, std::string& error) {
     m_path = SideFilePath(pcf, ".lock");
     m_text = std::to_string(::getpid()) + " " + std::to_string(port) + "\n";
     m_stale = false;
+    std::string why;
     for (int attempt = 0; attempt < 3; ++attempt) {
         Port::SafeWriter writer;
-        std::string why;
         if (writer.Open(m_path, why, {pcf}, Port::SafeWriter::Mode::CreateOnly) &&
             writer.Write(m_text, why) && writer.Commit(why)) {
             m_held = true;
             return true;
         }
         std::string held;
-        if (!Port::ReadRegularFile(m_path, held, why, 4096)) {
+        std::string unread;
+        if (!Port::ReadRegularFile(m_path, held, unread, 4096)) {
             continue; // gone between the two looks: try again
         }
         long pid = 0;
@@ -75,7 +76,7 @@ bool EditLock::Take(const std::string& pcf, int port, std::string& error) {
         m_stale = true;
         ::unlink(m_path.c_str());
     }
-    error = "cannot take the lock " + m_path;
+    error = "cannot take the lock " + m_path + ": " + why;
     return false;
 }
 

@@ -144,6 +144,8 @@ PlanSession::Step PlanSession::Diff(const PcfFile& before, const PcfFile& after)
     }
     Step step;
     step.at = head;
+    step.removed.reserve(a.size() - tail - head);
+    step.added.reserve(b.size() - tail - head);
     for (std::size_t i = head; i < a.size() - tail; ++i) {
         step.removed.push_back(a[i].text + a[i].end);
     }
@@ -264,7 +266,7 @@ PcfFile PlanSession::Reapplied(const PcfFile& disk) const {
     std::string error;
     base.Parse(m_diskText, m_pcfPath, error);
     const auto before = PinsOf(base);
-    const auto ours = m_pinOfPort;
+    const auto& ours = m_pinOfPort;
     const auto theirs = PinsOf(disk);
     std::set<std::string> ports;
     for (const auto* side : {&before, &ours}) {

@@ -463,7 +463,7 @@ void EditorServer::Imp::Loop() {
         const bool room = connections.size() < limits.connections;
         watched.push_back({listener, static_cast<short>(room ? POLLIN : 0), 0});
         for (const auto& [fd, c] : connections) {
-            short events = c.out.empty() ? POLLIN : POLLOUT;
+            const auto events = static_cast<short>(c.out.empty() ? POLLIN : POLLOUT);
             watched.push_back({fd, events, 0});
         }
         if (::poll(watched.data(), watched.size(), PollTimeout()) < 0 && errno != EINTR) {
