@@ -34,13 +34,13 @@ inline constexpr std::size_t kMaxRequestBody = std::size_t{1} << 20;
 
 /// What a request may cost the server before it is refused or dropped.
 struct ServerLimits {
-    std::size_t headBytes = std::size_t{16} * 1024;         ///< request line and headers (431 beyond)
-    std::size_t headLines = 100;               ///< header lines (431 beyond)
-    std::size_t body = kMaxRequestBody;        ///< by Content-Length only (413 beyond)
-    std::size_t connections = 1024;            ///< open at once; more are closed at accept
-    std::chrono::milliseconds headTime{10000}; ///< from the first byte to the head's end (408)
-    std::chrono::milliseconds bodyTime{30000}; ///< from the head's end to the body's end (408)
-    std::chrono::milliseconds idleTime{30000}; ///< a kept-alive connection sending nothing
+    std::size_t headBytes = std::size_t{16} * 1024; ///< request line and headers (431 beyond)
+    std::size_t headLines = 100;                    ///< header lines (431 beyond)
+    std::size_t body = kMaxRequestBody;             ///< by Content-Length only (413 beyond)
+    std::size_t connections = 1024;                 ///< open at once; more are closed at accept
+    std::chrono::milliseconds headTime{10000};      ///< from the first byte to the head's end (408)
+    std::chrono::milliseconds bodyTime{30000};      ///< from the head's end to the body's end (408)
+    std::chrono::milliseconds idleTime{30000};      ///< a kept-alive connection sending nothing
 };
 
 class EditorServer {
