@@ -780,7 +780,7 @@ bool Editor::Open(const EditorFiles& files, std::unique_ptr<DeviceModel> device,
     }
     for (const DesignPort& port : s.design.ports) {
         if (!ServableName(port.name, error)) {
-            error = files.design + ": " + error;
+            error.insert(0, files.design + ": ");
             return false;
         }
     }

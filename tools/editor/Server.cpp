@@ -132,7 +132,8 @@ HeadState ScanHead(const std::string& in, const ServerLimits& limits, std::size_
     end = in.find("\r\n\r\n");
     if (end != std::string::npos) {
         end += 4;
-        const auto lines = static_cast<std::size_t>(std::count(in.begin(), in.begin() + end, '\n'));
+        const auto lines = static_cast<std::size_t>(
+            std::count(in.begin(), in.begin() + static_cast<std::ptrdiff_t>(end), '\n'));
         return end > limits.headBytes || lines > limits.headLines + 2 ? HeadState::TooLarge
                                                                       : HeadState::Whole;
     }
