@@ -89,6 +89,90 @@ TEST_F(SafeFile, AReplacedFileKeepsItsModeAndALinkKeepsPointingAtTheNewContent) 
     EXPECT_EQ(Extras(m_dir / "elsewhere", {"link.txt"}), 0);
 }
 
+// 0664 with a group the writer is in, so that a writer keeping no mode (the temporary is
+// 0600) or no group fails here. Root may give a file to any group; others use one of their
+// own supplementary groups.
+TEST_F(SafeFile, AReplacedFileKeepsAGroupWritableModeAndItsGroup) {
+    gid_t group = 0;
+    if (::geteuid() == 0) {
+        group = 1;
+    } else {
+        gid_t groups[64];
+        const int count = ::getgroups(64, groups);
+        for (int i = 0; i < count && group == 0; ++i) {
+            group = groups[i] != ::getegid() ? groups[i] : 0;
+        }
+        if (group == 0) {
+            GTEST_SKIP() << "this user is in no second group to give the file to";
+        }
+    }
+    const fs::path shared = m_dir / "shared.pcf";
+    Put(shared, "old");
+    ASSERT_EQ(::chown(shared.c_str(), static_cast<uid_t>(-1), group), 0);
+    ASSERT_EQ(::chmod(shared.c_str(), 0664), 0);
+    std::string error;
+    ASSERT_TRUE(Port::WriteFileSafely(shared.string(), "new", error)) << error;
+    struct stat info {};
+    ASSERT_EQ(::stat(shared.c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 07777, 0664u);
+    EXPECT_EQ(info.st_gid, group);
+    EXPECT_EQ(Slurp(shared), "new");
+}
+
+// A read-only file in a folder the user may write is refused, for root as for anyone: the
+// mode says no one was meant to write it.
+TEST_F(SafeFile, AReadOnlyFileIsNotReplacedEvenWhereTheFolderAllowsIt) {
+    const fs::path locked = m_dir / "locked.pcf";
+    Put(locked, "mine");
+    ASSERT_EQ(::chmod(locked.c_str(), 0444), 0);
+    std::string error;
+    EXPECT_FALSE(Port::WriteFileSafely(locked.string(), "theirs", error));
+    EXPECT_NE(error.find("read-only"), std::string::npos) << error;
+    EXPECT_NE(error.find("0444"), std::string::npos) << error;
+    EXPECT_EQ(Slurp(locked), "mine");
+    EXPECT_EQ(ModeOf(locked), 0444u);
+    EXPECT_EQ(Extras(m_dir, {"locked.pcf"}), 0);
+}
+
+// Another user's 0644 file in a folder everyone may write: the writer could not write the
+// file itself, so it must not replace it (and take it over). Needs a second user: root
+// forks a child that becomes `nobody`.
+TEST_F(SafeFile, AnotherOwnersFileInAWritableFolderIsNotTakenOver) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "only root can make a file of another owner here";
+    }
+    ASSERT_EQ(::chmod(m_dir.c_str(), 0777), 0);
+    const fs::path theirs = m_dir / "theirs.pcf";
+    Put(theirs, "root's");
+    ASSERT_EQ(::chmod(theirs.c_str(), 0644), 0);
+    int pipe[2];
+    ASSERT_EQ(::pipe(pipe), 0);
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::close(pipe[0]);
+        if (::setgid(65534) != 0 || ::setuid(65534) != 0) {
+            ::_exit(2);
+        }
+        std::string error;
+        const bool written = Port::WriteFileSafely(theirs.string(), "nobody's", error);
+        (void)!::write(pipe[1], error.data(), error.size());
+        ::_exit(written ? 1 : 0);
+    }
+    ::close(pipe[1]);
+    char reason[512] = {};
+    (void)!::read(pipe[0], reason, sizeof reason - 1);
+    ::close(pipe[0]);
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    ASSERT_TRUE(WIFEXITED(status));
+    EXPECT_EQ(WEXITSTATUS(status), 0) << "replaced: " << reason;
+    EXPECT_NE(std::string(reason).find("read-only"), std::string::npos) << reason;
+    struct stat info {};
+    ASSERT_EQ(::stat(theirs.c_str(), &info), 0);
+    EXPECT_EQ(info.st_uid, 0u);
+    EXPECT_EQ(Slurp(theirs), "root's");
+}
+
 TEST_F(SafeFile, AnOutputThatIsAnInputIsRefusedHoweverItIsSpelled) {
     Put(m_dir / "input.txt", "precious");
     fs::create_hard_link(m_dir / "input.txt", m_dir / "hard.txt");

@@ -572,4 +572,78 @@ TEST_F(FileSafety, PeakMemoryStaysASmallMultipleOfTheColourScheme) {
     EXPECT_LE(peak, 4 * input + (64u << 20)) << "peak " << peak << " for " << input;
 }
 
+// ---- pins assign and whoever else writes the constraint file ---------------------------
+
+const char kTwoPortDesign[] = R"({"creator": "Yosys", "modules": {"top": {
+  "attributes": {"top": "00000000000000000000000000000001"},
+  "ports": {"a": {"direction": "input", "bits": [2]}, "b": {"direction": "output", "bits": [3]}},
+  "cells": {}, "netnames": {}}}})";
+
+bool HaveStrace() {
+    return std::system("strace -o /dev/null true >/dev/null 2>&1") == 0;
+}
+
+// The temporary is synced before it is renamed over the file, or a crash between the two
+// could publish a name for bytes that never reached the disk. strace records the order.
+TEST_F(FileSafety, TheTemporaryIsSyncedBeforeItReplacesTheFile) {
+    if (!HaveStrace()) {
+        GTEST_SKIP() << "strace is not installed or may not trace here";
+    }
+    WriteBytes(m_dir / "top.json", kTwoPortDesign);
+    WriteBytes(m_dir / "top.pcf", "# board\n");
+    const std::string log = (m_dir / "trace").string();
+    const std::string command =
+        // The leak checker cannot run under a tracer; the sanitizer build still checks the rest.
+        "cd " + Quote(m_dir.string()) +
+        " && ASAN_OPTIONS=detect_leaks=0 timeout 120 strace -f -o " + Quote(log) +
+        " -e trace=fsync,fdatasync,rename,renameat,renameat2,openat " + Quote(VENLOMER_TOOL_PATH) +
+        " pins assign --design top.json --pcf top.pcf --chipdb chip.txt --package dq50 b=10"
+        " >/dev/null 2>&1";
+    ASSERT_EQ(std::system(command.c_str()), 0) << Slurp(log);
+    EXPECT_EQ(Slurp(m_dir / "top.pcf"), "# board\nset_io b 10\n");
+    // The descriptor the temporary was opened on, its fsync, then the rename.
+    std::istringstream lines(Slurp(log));
+    std::string line;
+    std::string tempFd;
+    bool synced = false;
+    bool renamed = false;
+    while (std::getline(lines, line)) {
+        const auto tmp = line.find(".tmp\", O_WRONLY|O_CREAT|O_EXCL");
+        if (tmp != std::string::npos && line.find("= ") != std::string::npos) {
+            tempFd = line.substr(line.rfind("= ") + 2);
+        } else if (!tempFd.empty() && !renamed &&
+                   line.find("fsync(" + tempFd + ")") != std::string::npos) {
+            synced = true; // a later fsync of that number is the folder's
+        } else if (line.find("rename") != std::string::npos && Contains(line, "top.pcf")) {
+            renamed = true;
+        }
+    }
+    EXPECT_FALSE(tempFd.empty()) << Slurp(log);
+    EXPECT_TRUE(synced) << "no fsync of the temporary before the rename:\n" << Slurp(log);
+    EXPECT_TRUE(renamed) << Slurp(log);
+}
+
+// A line added to the file while pins assign works is not dropped: the file is read again
+// before the write, and a change refuses the write. strace holds the second read back for
+// a second so that the change lands in between.
+TEST_F(FileSafety, PinsAssignRefusesWhenTheFileChangesBetweenItsReadAndItsWrite) {
+    if (!HaveStrace()) {
+        GTEST_SKIP() << "strace is not installed or may not trace here";
+    }
+    WriteBytes(m_dir / "top.json", kTwoPortDesign);
+    WriteBytes(m_dir / "top.pcf", "# board\n");
+    const std::string command =
+        "cd " + Quote(m_dir.string()) +
+        " && ASAN_OPTIONS=detect_leaks=0 timeout 120 strace -f -o /dev/null -P top.pcf " +
+        "-e trace=openat -e inject=openat:delay_enter=1500000:when=2 " + Quote(VENLOMER_TOOL_PATH) +
+        " pins assign --design top.json --pcf top.pcf --chipdb chip.txt --package dq50 b=10"
+        " >stdout 2>stderr";
+    std::thread tool([&] { (void)std::system(command.c_str()); });
+    std::this_thread::sleep_for(std::chrono::milliseconds(900));
+    WriteBytes(m_dir / "top.pcf", "# board\nset_io a 11\n");
+    tool.join();
+    EXPECT_EQ(Slurp(m_dir / "top.pcf"), "# board\nset_io a 11\n");
+    EXPECT_TRUE(Contains(Slurp(m_dir / "stderr"), "changed on disk")) << Slurp(m_dir / "stderr");
+}
+
 } // namespace

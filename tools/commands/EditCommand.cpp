@@ -1,21 +1,20 @@
 //===-- tools/commands/EditCommand.cpp - venlomer edit: the editor in a browser ---===//
 //
-// Options, the recovery file's offer, signals and the autosave: everything around the
+// Options, the lock, the recovery file's offer and signals: everything around the
 // engine and the server that a command needs and a test does not.
 //
 //===------------------------------------------------------------------------------===//
 #include "Commands.h"
+#include "EditLock.h"
 #include "Editor.h"
 #include "Server.h"
 
 #include "DeviceOptions.h"
 
-#include <condition_variable>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
-#include <mutex>
 #include <pthread.h>
 #include <thread>
 
@@ -25,40 +24,23 @@ namespace {
 
 const char kCommand[] = "edit";
 
-// How often unsaved work goes to the recovery file.
-constexpr auto kRecoveryInterval = std::chrono::seconds(2);
-
-// The options that need no file opened: the device, the port, the recovery choice.
-int CheckOptions(const ParsedArgs& args, EditorFiles& files, int& port) {
-    files.design = args.Value("--design");
-    files.pcf = args.Value("--pcf");
-    if (files.design.empty() || files.pcf.empty()) {
-        return UsageError(kCommand, "--design and --pcf are required");
+// The port to listen on from --port; -1 after a usage error has been reported.
+int PortOption(const ParsedArgs& args) {
+    if (!args.Has("--port")) {
+        return 0;
     }
-    if (int status = ResolveDeviceOptions(kCommand, args, files.device); status != kExitOk) {
-        return status;
+    std::string text = args.Value("--port");
+    char* end = nullptr;
+    long value = std::strtol(text.c_str(), &end, 10);
+    if (text.empty() || *end != '\0' || value < 0 || value > 65535) {
+        UsageError(kCommand, "--port wants 0..65535, got \"" + text + "\"");
+        return -1;
     }
-    if (files.device.chipDb == "-") {
-        return UsageError(kCommand, "the editor reads its chip database from a file, not "
-                                    "standard input");
-    }
-    if (args.Has("--port")) {
-        std::string text = args.Value("--port");
-        char* end = nullptr;
-        long value = std::strtol(text.c_str(), &end, 10);
-        if (text.empty() || *end != '\0' || value < 0 || value > 65535) {
-            return UsageError(kCommand, "--port wants 0..65535, got \"" + text + "\"");
-        }
-        port = static_cast<int>(value);
-    }
-    if (args.Has("--recover") && args.Has("--discard-recovery")) {
-        return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
-    }
-    return kExitOk;
+    return static_cast<int>(value);
 }
 
-// What an earlier session left unsaved: loaded, dropped, or in the way.
-int SettleRecovery(const ParsedArgs& args, Editor& editor, const EditorFiles& files) {
+// What an earlier session left: loaded, dropped, or a refusal to start over it.
+int TakeRecovery(const ParsedArgs& args, Editor& editor, const std::string& pcf) {
     std::string error;
     if (!editor.HasRecovery()) {
         if (args.Has("--recover")) {
@@ -72,7 +54,7 @@ int SettleRecovery(const ParsedArgs& args, Editor& editor, const EditorFiles& fi
             return Refused(kCommand, error);
         }
         std::printf("Loaded the unsaved changes of %s; Save writes them to %s\n",
-                    editor.RecoveryPath().c_str(), files.pcf.c_str());
+                    editor.RecoveryPath().c_str(), pcf.c_str());
         return kExitOk;
     }
     if (args.Has("--discard-recovery")) {
@@ -88,8 +70,7 @@ int SettleRecovery(const ParsedArgs& args, Editor& editor, const EditorFiles& fi
                                  "--recover to load them, or --discard-recovery to drop them");
 }
 
-// Serves until SIGINT or SIGTERM, writing unsaved work to the recovery file meanwhile and
-// once more at the end.
+// Serves until SIGINT or SIGTERM, then says where unsaved work is.
 int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
     // Signals are taken by one thread with sigwait, so no handler runs inside the server
     // or the library; every thread started below inherits the mask.
@@ -99,20 +80,7 @@ int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
     sigaddset(&stopSignals, SIGTERM);
     pthread_sigmask(SIG_BLOCK, &stopSignals, nullptr);
 
-    std::mutex lock;
-    std::condition_variable wake;
-    bool stopping = false;
     std::thread serving([&] { server.Run(); });
-    std::thread autosave([&] {
-        std::unique_lock<std::mutex> hold(lock);
-        while (!wake.wait_for(hold, kRecoveryInterval, [&] { return stopping; })) {
-            std::string why;
-            if (!editor.WriteRecovery(why)) {
-                std::fprintf(stderr, "venlomer edit: the recovery file was not written: %s\n",
-                             why.c_str());
-            }
-        }
-    });
     std::printf("Editing %s with %s on %s\nOpen %s in a browser; Ctrl-C stops.\n",
                 files.pcf.c_str(), files.design.c_str(), files.device.chipDb.c_str(),
                 server.Url().c_str());
@@ -122,12 +90,6 @@ int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
     sigwait(&stopSignals, &signal);
     server.Stop();
     serving.join();
-    {
-        std::lock_guard<std::mutex> hold(lock);
-        stopping = true;
-    }
-    wake.notify_all();
-    autosave.join();
     std::string error;
     if (!editor.WriteRecovery(error)) {
         return Refused(kCommand, "the unsaved changes were not kept: " + error);
@@ -143,8 +105,24 @@ int Serve(Editor& editor, EditorServer& server, const EditorFiles& files) {
 
 int Run(const ParsedArgs& args) {
     EditorFiles files;
-    int port = 0;
-    if (int status = CheckOptions(args, files, port); status != kExitOk) {
+    files.design = args.Value("--design");
+    files.pcf = args.Value("--pcf");
+    if (files.design.empty() || files.pcf.empty()) {
+        return UsageError(kCommand, "--design and --pcf are required");
+    }
+    if (args.Value("--chipdb") == "-") {
+        return UsageError(kCommand, "the editor reads its chip database from a file, not "
+                                    "standard input");
+    }
+    const int port = PortOption(args);
+    if (port < 0) {
+        return kExitUsage;
+    }
+    if (args.Has("--recover") && args.Has("--discard-recovery")) {
+        return UsageError(kCommand, "--recover and --discard-recovery exclude each other");
+    }
+    std::unique_ptr<DeviceModel> device;
+    if (int status = OpenDevice(kCommand, args, files.device, device); status != kExitOk) {
         return status;
     }
     std::string page = FindDataFile("editor/index.html");
@@ -157,16 +135,21 @@ int Run(const ParsedArgs& args) {
     }
     Editor editor;
     std::string error;
-    if (!editor.Open(files, error)) {
+    if (!editor.Open(files, std::move(device), error)) {
         return Refused(kCommand, error);
     }
-    if (int status = SettleRecovery(args, editor, files); status != kExitOk) {
-        return status;
-    }
+    // The lock comes before the recovery file: that file is the running editor's work.
     EditorServer server(editor);
+    EditLock lock;
     if (!server.Load(std::filesystem::path(page).parent_path().string(), error) ||
-        !server.Bind(port, error)) {
+        !server.Bind(port, error) || !lock.Take(files.pcf, server.Port(), error)) {
         return Refused(kCommand, error);
+    }
+    if (lock.TookOverStale()) {
+        std::printf("Took over %s: the editor that left it is gone\n", lock.Path().c_str());
+    }
+    if (int status = TakeRecovery(args, editor, files.pcf); status != kExitOk) {
+        return status;
     }
     return Serve(editor, server, files);
 }
@@ -191,9 +174,11 @@ const Command& EditCommand() {
          0,
          0,
          "The server listens on 127.0.0.1 only and prints the address to open. Unsaved\n"
-         "changes go to FILE.recovery beside the constraint file every few seconds and on\n"
-         "stop (Ctrl-C or SIGTERM); a later start refuses to run over them until told\n"
-         "--recover or --discard-recovery.\n"
+         "changes go to FILE.recovery beside the constraint file after every change; a\n"
+         "later start refuses to run over them until told --recover or\n"
+         "--discard-recovery. One editor per constraint file: a second is refused with\n"
+         "the first one's pid and port (FILE.lock); a lock left by a killed editor is\n"
+         "taken over. Save refuses to write over a file changed on disk meanwhile.\n"
          "Example: venlomer edit --design top.json --pcf top.pcf --device 8k\n"},
         Run};
     return command;

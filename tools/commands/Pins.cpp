@@ -185,6 +185,23 @@ int RunCheck(const ParsedArgs& args) {
 
 // ---- assign ----------------------------------------------------------------------------
 
+// Another program (an editor, a hand) may have changed the constraint file while the
+// plan was worked out from it; writing then would drop its lines without a word.
+bool StillAsRead(const Plan& plan, std::string& error) {
+    std::error_code ec;
+    const bool exists = std::filesystem::exists(std::filesystem::symlink_status(plan.pcfPath, ec));
+    std::string now;
+    if (exists && !Port::ReadRegularFile(plan.pcfPath, now, error)) {
+        return false;
+    }
+    if (exists != plan.pcfExisted || now != plan.pcf.Text()) {
+        error = plan.pcfPath + " changed on disk while this ran; nothing was written (run again "
+                               "to plan on the new file)";
+        return false;
+    }
+    return true;
+}
+
 // PORT=PIN operands; a port given twice is a slip of the command line, not a plan.
 int ReadAssignments(const ParsedArgs& args,
                     std::vector<std::pair<std::string, std::string>>& wanted) {
@@ -397,7 +414,8 @@ int RunAssign(const ParsedArgs& args) {
         return kExitOk;
     }
     std::string error;
-    if (!Port::WriteFileSafely(plan.pcfPath, text, error, {plan.designPath, plan.source.chipDb})) {
+    if (!StillAsRead(plan, error) ||
+        !Port::WriteFileSafely(plan.pcfPath, text, error, {plan.designPath, plan.source.chipDb})) {
         return Refused(kAssign, error);
     }
     std::size_t lines = 0;

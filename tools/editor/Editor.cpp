@@ -1,11 +1,14 @@
 //===-- tools/editor/Editor.cpp - the pin-planning editor's engine --------===//
 #include "Editor.h"
 
+#include "PlanSession.h"
+
 #include "CompareFlags.h"
 #include "DeviceModel.h"
 #include "PortHolders.h"
 
 #include "CommonI/RefCountPtr.h"
+#include "Port/Regexp.h"
 #include "Port/SafeFile.h"
 #include "VnI/ITreeNode.h"
 #include "VnI/PropertyType.h"
@@ -37,14 +40,41 @@ using json = nlohmann::json;
 using Text = Port::StringBase<char>;
 template <class T> using Ptr = CommonI::RefCountPtr<T>;
 
-// How many steps undo keeps; a plan is a few hundred assignments at most.
-constexpr std::size_t kUndoDepth = 1000;
+using Refusal = PlanRefusal;
 
-// A refusal: the request changes nothing and the page shows `what`.
-struct Refusal {
-    int status;
-    std::string what;
-};
+// Nesting deeper than this is no request of the page's; refused before parsing, so that
+// neither the parser nor a refusal quoting the value recurses without bound.
+constexpr int kMaxJsonDepth = 32;
+
+// Text from a request quoted in a refusal is cut to this.
+constexpr std::size_t kMaxQuoted = 200;
+
+std::string Quoted(const std::string& text) {
+    return text.size() <= kMaxQuoted ? text : text.substr(0, kMaxQuoted) + "...";
+}
+
+// The deepest nesting of `body`, counted without parsing (strings skipped), stopping as
+// soon as it passes the limit.
+bool TooDeep(const std::string& body) {
+    int depth = 0;
+    bool inString = false;
+    for (std::size_t i = 0; i < body.size(); ++i) {
+        const char c = body[i];
+        if (inString) {
+            i += c == '\\' ? 1 : 0;
+            inString = c != '"';
+        } else if (c == '"') {
+            inString = true;
+        } else if (c == '[' || c == '{') {
+            if (++depth > kMaxJsonDepth) {
+                return true;
+            }
+        } else if (c == ']' || c == '}') {
+            --depth;
+        }
+    }
+    return false;
+}
 
 std::string ColorHex(const Ptr<VnI::IColorProperty>& color) {
     if (!color || !color->IsValid()) {
@@ -106,20 +136,13 @@ struct Editor::State {
     std::unique_ptr<DeviceModel> device;
     const ChipDb* dbp = nullptr;
     Design design;
-    PcfFile pcf;
+    PlanSession plan;
     std::unique_ptr<PortHolders> ports;
     std::unordered_map<std::string, PortHolder*> portByName;
     Ptr<VnI::ITreeModel> designTree;
-    mutable DevicePalette palette; // remembers whether it fell back; no plan state
-
-    std::vector<PcfFile> undo;
-    std::vector<PcfFile> redo;
-    long revision = 0;
-    std::string savedText;     // what the constraint file on disk holds
-    std::string recoveredText; // what the recovery file holds
-    bool ownsRecovery = false; // written or loaded by this session
-    std::vector<PinProblem> problems;
+    mutable DevicePalette palette;    // remembers whether it fell back; no plan state
     std::vector<std::string> matches; // ids of the last search
+    std::string recoveryError;        // why the last change's recovery was not written
 
     ~State() {
         // The device model's managers may hold port holders, which die before the model.
@@ -134,12 +157,23 @@ struct Editor::State {
     Vn::Eng::SelectionManager& selection() const { return device->Selection(); }
     Vn::Eng::HighlightManager& highlight() const { return device->Highlight(); }
 
-    // By text, so that undoing back to the saved plan counts as saved.
-    bool Unsaved() const { return pcf.Text() != savedText; }
+    // The holders' Pin and Bank follow the plan, so that a search finds ports by pin.
+    void AfterChange() {
+        ports->ApplyPins(db(), plan.Pcf());
+        recoveryError.clear();
+        if (!plan.WriteRecovery(recoveryError)) {
+            recoveryError = "unsaved work is not in the recovery file: " + recoveryError;
+        }
+    }
 
-    void Recheck() {
-        problems = CheckPins(db(), design, files.design, pcf, false);
-        ports->ApplyPins(db(), pcf);
+    // Ports by name, in one pass over the holders (they are in design order).
+    void IndexPorts() {
+        ports = std::make_unique<PortHolders>(design);
+        const std::list<VnI::IPropertyHolder*> holders = ports->List();
+        auto holder = holders.begin();
+        for (const DesignPort& port : design.ports) {
+            portByName.emplace(port.name, static_cast<PortHolder*>(*holder++));
+        }
     }
 
     // The design > bus > bit tree; a one-bit port sits directly under the design.
@@ -233,7 +267,7 @@ struct Editor::State {
     PortHolder* PortNamed(const std::string& name) const {
         auto it = portByName.find(name);
         if (it == portByName.end()) {
-            throw Refusal{404, "the design has no port \"" + name + "\""};
+            throw Refusal{404, "the design has no port \"" + Quoted(name) + "\""};
         }
         return it->second;
     }
@@ -249,47 +283,41 @@ struct Editor::State {
         return state;
     }
 
-    // What the edits change: the assignments, their checks, undo and save.
-    json PlanJson() const {
-        json state;
-        state["revision"] = revision;
-        state["saved"] = !Unsaved();
-        state["canUndo"] = !undo.empty();
-        state["canRedo"] = !redo.empty();
-        state["files"] = {{"design", std::filesystem::path(files.design).filename().string()},
-                          {"pcf", std::filesystem::path(files.pcf).filename().string()}};
-        json portList = json::array();
+    json PortsJson() const {
+        const auto& pins = plan.PinOfPort();
+        std::unordered_map<std::string, int> bankOfPin;
+        for (const Pin& pin : db().pins) {
+            bankOfPin.emplace(pin.name, pin.bank);
+        }
+        json list = json::array();
         for (const DesignPort& port : design.ports) {
-            PortHolder* holder = portByName.at(port.name);
-            portList.push_back(
-                {{"id", PortId(port.name)},
-                 {"name", port.name},
-                 {"bus", port.bus},
-                 {"bit", port.bit},
-                 {"direction", PortDirectionName(port.direction)},
-                 {"clock", port.clock},
-                 {"pin", holder->GetPropertyByName("Pin")->GetStringProperty().str()},
-                 {"bank", holder->GetPropertyByName("Bank")->GetIntProperty()}});
+            auto pin = pins.find(port.name);
+            std::string name = pin == pins.end() ? "" : pin->second;
+            auto bank = bankOfPin.find(name);
+            list.push_back({{"id", PortId(port.name)},
+                            {"name", port.name},
+                            {"bus", port.bus},
+                            {"bit", port.bit},
+                            {"direction", PortDirectionName(port.direction)},
+                            {"clock", port.clock},
+                            {"pin", name},
+                            {"bank", bank == bankOfPin.end() ? -1 : bank->second}});
         }
-        state["ports"] = std::move(portList);
-        json assignments = json::object();
-        for (const PcfLine& line : pcf.Lines()) {
-            if (line.kind == PcfLine::Kind::SetIo && !assignments.contains(line.pin)) {
-                assignments[line.pin] = line.port;
-            }
-        }
-        state["assignments"] = std::move(assignments);
-        json problemList = json::array();
+        return list;
+    }
+
+    json ProblemsJson(json& state) const {
+        json list = json::array();
         std::set<std::string> problemPins;
         std::set<std::string> problemPorts;
         int errors = 0;
-        for (const PinProblem& problem : problems) {
+        for (const PinProblem& problem : plan.Problems()) {
             bool error = problem.severity == PinProblem::Severity::Error;
             errors += error ? 1 : 0;
-            problemList.push_back({{"severity", error ? "error" : "warning"},
-                                   {"port", problem.port},
-                                   {"pin", problem.pin},
-                                   {"message", problem.message}});
+            list.push_back({{"severity", error ? "error" : "warning"},
+                            {"port", problem.port},
+                            {"pin", problem.pin},
+                            {"message", problem.message}});
             if (!problem.pin.empty()) {
                 problemPins.insert(problem.pin);
             }
@@ -297,10 +325,31 @@ struct Editor::State {
                 problemPorts.insert(problem.port);
             }
         }
-        state["problems"] = std::move(problemList);
         state["errors"] = errors;
         state["problemPins"] = problemPins;
         state["problemPorts"] = problemPorts;
+        return list;
+    }
+
+    // What the edits change: the assignments, their checks, undo and save.
+    json PlanJson() const {
+        json state;
+        state["revision"] = plan.Revision();
+        state["saved"] = !plan.Unsaved();
+        state["canUndo"] = plan.CanUndo();
+        state["canRedo"] = plan.CanRedo();
+        state["recoveryError"] = recoveryError;
+        state["files"] = {{"design", std::filesystem::path(files.design).filename().string()},
+                          {"pcf", std::filesystem::path(files.pcf).filename().string()}};
+        state["ports"] = PortsJson();
+        json assignments = json::object();
+        for (const auto& [port, pin] : plan.PinOfPort()) {
+            if (!assignments.contains(pin)) {
+                assignments[pin] = port;
+            }
+        }
+        state["assignments"] = std::move(assignments);
+        state["problems"] = ProblemsJson(state);
         return state;
     }
 
@@ -308,7 +357,7 @@ struct Editor::State {
     // along so that the page's undo step stays the plan's.
     json MarksJson() const {
         json state;
-        state["revision"] = revision;
+        state["revision"] = plan.Revision();
         json selected = json::array();
         for (auto it = selection().GetAllSelectedItems(); !it->IsEnd(); it->Next()) {
             std::string id = IdOf(it->CurrentItem());
@@ -434,77 +483,6 @@ struct Editor::State {
         return {{"id", id}, {"kind", id.substr(0, id.find(':'))}, {"properties", std::move(list)}};
     }
 
-    // ---- changes ------------------------------------------------------------------------
-
-    // Applies `change` to a copy; keeps it only when it adds no error.
-    template <class Change> void Edit(Change change) {
-        PcfFile next = pcf;
-        change(next);
-        auto nextProblems = CheckPins(db(), design, files.design, next, false);
-        std::set<std::string> before;
-        for (const PinProblem& p : problems) {
-            if (p.severity == PinProblem::Severity::Error) {
-                before.insert(p.message);
-            }
-        }
-        std::string added;
-        for (const PinProblem& p : nextProblems) {
-            if (p.severity == PinProblem::Severity::Error && before.count(p.message) == 0) {
-                added += (added.empty() ? "" : "; ") + p.message;
-            }
-        }
-        if (!added.empty()) {
-            throw Refusal{409, "refused: " + added};
-        }
-        undo.push_back(std::move(pcf));
-        if (undo.size() > kUndoDepth) {
-            undo.erase(undo.begin());
-        }
-        redo.clear();
-        pcf = std::move(next);
-        ++revision;
-        Recheck();
-    }
-
-    void CheckStep(const json& request) const {
-        auto it = request.find("step");
-        if (it == request.end() || !it->is_number_integer()) {
-            throw Refusal{400, "undo and redo need \"step\": the revision the page shows"};
-        }
-        if (it->get<long>() != revision) {
-            throw Refusal{409, "stale step " + std::to_string(it->get<long>()) +
-                                   ": the plan is at revision " + std::to_string(revision) +
-                                   "; reload to see it"};
-        }
-    }
-
-    void Travel(std::vector<PcfFile>& from, std::vector<PcfFile>& to, const char* what) {
-        if (from.empty()) {
-            throw Refusal{409, std::string("nothing to ") + what};
-        }
-        to.push_back(std::move(pcf));
-        pcf = std::move(from.back());
-        from.pop_back();
-        ++revision;
-        Recheck();
-    }
-
-    void Save() {
-        std::string error;
-        if (!Port::WriteFileSafely(
-                files.pcf, pcf.Text(), error,
-                {files.design, files.device.chipDb, DeviceModel::ColourSchemePath()})) {
-            throw Refusal{500, error};
-        }
-        savedText = pcf.Text();
-        std::error_code ec;
-        std::filesystem::remove(RecoveryPathOf(files.pcf), ec);
-        recoveredText = savedText;
-        ownsRecovery = false;
-    }
-
-    static std::string RecoveryPathOf(const std::string& pcf) { return pcf + ".recovery"; }
-
     // ---- search and selection ----------------------------------------------------------
 
     // The value typed as the schema declares `property`, since a property only equals one
@@ -521,7 +499,7 @@ struct Editor::State {
             int number = 0;
             auto [end, ec] = std::from_chars(value.data(), value.data() + value.size(), number);
             if (ec != std::errc() || end != value.data() + value.size()) {
-                throw Refusal{400, property + " is a whole number; got \"" + value + "\""};
+                throw Refusal{400, property + " is a whole number; got \"" + Quoted(value) + "\""};
             }
             return Ptr<VnI::IProperty>::Adopt(
                 Vn::Eng::PropertyFactory::CreateIntProperty(number, true));
@@ -529,7 +507,7 @@ struct Editor::State {
         case VnI::BOOL_TYPE: {
             bool yes = value == "yes" || value == "true" || value == "1";
             if (!yes && value != "no" && value != "false" && value != "0") {
-                throw Refusal{400, property + " is yes or no; got \"" + value + "\""};
+                throw Refusal{400, property + " is yes or no; got \"" + Quoted(value) + "\""};
             }
             return Ptr<VnI::IProperty>::Adopt(
                 Vn::Eng::PropertyFactory::CreateBoolProperty(yes, true));
@@ -575,10 +553,13 @@ struct Editor::State {
                 const std::optional<int> bit =
                     flag.is_string() ? CompareFlagNamed(flag.get<std::string>()) : std::nullopt;
                 if (!bit) {
-                    throw Refusal{400, "unknown compare flag " + flag.dump()};
+                    throw Refusal{400, "unknown compare flag " + Quoted(flag.dump())};
                 }
                 flags |= *bit;
             }
+        }
+        if ((flags & VnI::MATCH_REGEXP) != 0 && !Port_Regexp(std::string_view(value)).IsValid()) {
+            throw Refusal{400, "\"" + Quoted(value) + "\" is no valid regular expression"};
         }
         std::vector<VnI::IPropertyHolder*> found;
         std::list<VnI::IPropertyHolder*> pinList(device->Pins().begin(), device->Pins().end());
@@ -586,7 +567,7 @@ struct Editor::State {
         bool any = SearchOver(pinList, device->PinNames(), property, value, flags, found);
         any = SearchOver(portList, ports->Names(), property, value, flags, found) || any;
         if (!any) {
-            throw Refusal{400, "pins and ports have no property \"" + property + "\""};
+            throw Refusal{400, "pins and ports have no property \"" + Quoted(property) + "\""};
         }
         highlight().RemoveAll();
         matches.clear();
@@ -606,7 +587,7 @@ struct Editor::State {
         std::string id = StringField(request, "id");
         VnI::IPropertyHolder* holder = HolderOf(id);
         if (holder == nullptr) {
-            throw Refusal{404, "nothing is called \"" + id + "\""};
+            throw Refusal{404, "nothing is called \"" + Quoted(id) + "\""};
         }
         std::string mode = request.value("mode", "replace");
         bool descend = request.value("descend", false);
@@ -622,127 +603,199 @@ struct Editor::State {
         } else if (mode == "add") {
             selection().AddSelectedItem(holder, descend);
         } else {
-            throw Refusal{400, "mode is replace, toggle or add; got \"" + mode + "\""};
+            throw Refusal{400, "mode is replace, toggle or add; got \"" + Quoted(mode) + "\""};
         }
     }
 
+    // ---- routes -------------------------------------------------------------------------
+
+    json Assign(const json& request) {
+        std::string port = StringField(request, "port");
+        std::string pin = StringField(request, "pin");
+        PortNamed(port);
+        if (device->FindPin(pin) == nullptr) {
+            throw Refusal{404, "package " + db().package + " has no pin \"" + Quoted(pin) + "\""};
+        }
+        plan.Edit([&](PcfFile& next) { next.Assign(port, pin); });
+        return Changed();
+    }
+
+    json Unassign(const json& request) {
+        std::string port = StringField(request, "port");
+        PortNamed(port);
+        plan.Edit([&](PcfFile& next) {
+            if (next.Unassign(port) == 0) {
+                throw Refusal{409, "port \"" + Quoted(port) + "\" has no pin"};
+            }
+        });
+        return Changed();
+    }
+
+    json Auto(const json&) {
+        plan.Edit([&](PcfFile& next) {
+            if (AutoAssign(db(), design, next).empty()) {
+                throw Refusal{409, "no port without a pin got one"};
+            }
+        });
+        return Changed();
+    }
+
+    static long Step(const json& request) {
+        auto it = request.find("step");
+        if (it == request.end() || !it->is_number_integer()) {
+            throw Refusal{400, "undo and redo need \"step\": the revision the page shows"};
+        }
+        return it->get<long>();
+    }
+
+    json Save(const json&) {
+        plan.Save({files.design, files.device.chipDb, DeviceModel::ColourSchemePath()});
+        recoveryError.clear();
+        return PlanJson();
+    }
+
+    json TakeDisk(const json& request) {
+        auto it = request.find("reapply");
+        if (it == request.end() || !it->is_boolean()) {
+            throw Refusal{400, "\"reapply\" is true (keep this editor's edits on top) or false"};
+        }
+        plan.TakeDisk(it->get<bool>());
+        return Changed();
+    }
+
+    json Changed() {
+        AfterChange();
+        return PlanJson();
+    }
+
+    using Route = json (State::*)(const json&);
+    static const std::map<std::string, std::pair<bool, Route>>& Routes() {
+        // path -> (whether it is a POST, what serves it)
+        static const std::map<std::string, std::pair<bool, Route>> routes{
+            {"/api/ping", {false, &State::GetPing}},
+            {"/api/state", {false, &State::GetState}},
+            {"/api/device", {false, &State::GetDevice}},
+            {"/api/tree", {false, &State::GetTree}},
+            {"/api/properties", {false, &State::GetProperties}},
+            {"/api/search", {true, &State::PostSearch}},
+            {"/api/select", {true, &State::PostSelect}},
+            {"/api/assign", {true, &State::Assign}},
+            {"/api/unassign", {true, &State::Unassign}},
+            {"/api/auto", {true, &State::Auto}},
+            {"/api/undo", {true, &State::Undo}},
+            {"/api/redo", {true, &State::Redo}},
+            {"/api/save", {true, &State::Save}},
+            {"/api/take-disk", {true, &State::TakeDisk}},
+        };
+        return routes;
+    }
+
+    json GetPing(const json&) { return {{"revision", plan.Revision()}}; }
+    json GetState(const json&) { return StateJson(); }
+    json GetDevice(const json&) { return DeviceJson(); }
+    json GetTree(const json&) { return TreeJson(); }
+    json GetProperties(const json&) { return PropertiesJson(); }
+    json PostSearch(const json& request) {
+        Search(request);
+        return MarksJson();
+    }
+    json PostSelect(const json& request) {
+        Select(request);
+        return MarksJson();
+    }
+    json Undo(const json& request) {
+        plan.Undo(Step(request));
+        return Changed();
+    }
+    json Redo(const json& request) {
+        plan.Redo(Step(request));
+        return Changed();
+    }
+
     json Dispatch(const std::string& method, const std::string& path, const std::string& body) {
-        bool post = method == "POST";
+        const bool post = method == "POST";
         if (!post && method != "GET") {
-            throw Refusal{405, method + " is not served"};
+            throw Refusal{405, Quoted(method) + " is not served"};
+        }
+        auto route = Routes().find(path);
+        if (route == Routes().end()) {
+            throw Refusal{404, "no such API: " + Quoted(path)};
+        }
+        if (route->second.first != post) {
+            throw Refusal{405, path + " wants " + (route->second.first ? "POST" : "GET")};
         }
         json request = json::object();
         if (post) {
+            if (TooDeep(body)) {
+                throw Refusal{400, "the body nests deeper than " + std::to_string(kMaxJsonDepth) +
+                                       " levels"};
+            }
             request = json::parse(body, nullptr, false);
             if (request.is_discarded() || !request.is_object()) {
                 throw Refusal{400, "the body is no JSON object"};
             }
         }
-        auto want = [&](bool isPost) {
-            if (post != isPost) {
-                throw Refusal{405, path + " wants " + (isPost ? "POST" : "GET")};
-            }
-        };
-        if (path == "/api/state") {
-            want(false);
-            return StateJson();
-        }
-        if (path == "/api/device") {
-            want(false);
-            return DeviceJson();
-        }
-        if (path == "/api/tree") {
-            want(false);
-            return TreeJson();
-        }
-        if (path == "/api/properties") {
-            want(false);
-            return PropertiesJson();
-        }
-        if (path == "/api/search") {
-            want(true);
-            Search(request);
-            return MarksJson();
-        }
-        if (path == "/api/select") {
-            want(true);
-            Select(request);
-            return MarksJson();
-        }
-        if (path == "/api/assign") {
-            want(true);
-            std::string port = StringField(request, "port");
-            std::string pin = StringField(request, "pin");
-            PortNamed(port);
-            if (device->FindPin(pin) == nullptr) {
-                throw Refusal{404, "package " + db().package + " has no pin \"" + pin + "\""};
-            }
-            Edit([&](PcfFile& next) { next.Assign(port, pin); });
-            return PlanJson();
-        }
-        if (path == "/api/unassign") {
-            want(true);
-            std::string port = StringField(request, "port");
-            PortNamed(port);
-            Edit([&](PcfFile& next) {
-                if (next.Unassign(port) == 0) {
-                    throw Refusal{409, "port \"" + port + "\" has no pin"};
-                }
-            });
-            return PlanJson();
-        }
-        if (path == "/api/auto") {
-            want(true);
-            Edit([&](PcfFile& next) {
-                if (AutoAssign(db(), design, next).empty()) {
-                    throw Refusal{409, "no port without a pin got one"};
-                }
-            });
-            return PlanJson();
-        }
-        if (path == "/api/undo" || path == "/api/redo") {
-            want(true);
-            CheckStep(request);
-            bool isUndo = path == "/api/undo";
-            Travel(isUndo ? undo : redo, isUndo ? redo : undo, isUndo ? "undo" : "redo");
-            return PlanJson();
-        }
-        if (path == "/api/save") {
-            want(true);
-            Save();
-            return PlanJson();
-        }
-        throw Refusal{404, "no such API: " + path};
+        return (this->*route->second.second)(request);
     }
 };
+
+namespace {
+
+// A name the page could not show or send back as it is: the holders keep names as C
+// strings, and a control byte has no place in a constraint file.
+bool ServableName(const std::string& name, std::string& why) {
+    for (unsigned char c : name) {
+        if (c < 0x20 || c == 0x7f) {
+            why = "port \"" + Port::Printable(Quoted(name)) +
+                  "\" holds a control byte; the editor cannot serve it";
+            return false;
+        }
+    }
+    return true;
+}
+
+std::string Dump(const json& value) {
+    return value.dump(-1, ' ', false, json::error_handler_t::replace);
+}
+
+} // namespace
 
 Editor::Editor() : m_state(std::make_unique<State>()) {}
 
 Editor::~Editor() = default;
 
 bool Editor::Open(const EditorFiles& files, std::string& error) {
+    std::unique_ptr<DeviceModel> device = DeviceModel::Open(files.device, error);
+    return device && Open(files, std::move(device), error);
+}
+
+bool Editor::Open(const EditorFiles& files, std::unique_ptr<DeviceModel> device,
+                  std::string& error) {
     std::lock_guard<std::mutex> hold(m_lock);
     State& s = *m_state;
     s.files = files;
-    s.device = DeviceModel::Open(files.device, error);
-    if (!s.device || !ReadYosysPortsFile(files.design, s.design, error) ||
-        !s.pcf.ParseFile(files.pcf, error, true)) {
+    s.device = std::move(device);
+    if (!ReadYosysPortsFile(files.design, s.design, error)) {
         return false;
     }
-    s.dbp = &s.device->Db();
-    s.ports = std::make_unique<PortHolders>(s.design);
     for (const DesignPort& port : s.design.ports) {
-        s.portByName.emplace(port.name, s.ports->Find(port.name));
+        if (!ServableName(port.name, error)) {
+            error.insert(0, files.design + ": ");
+            return false;
+        }
     }
+    s.dbp = &s.device->Db();
+    if (!s.plan.Open(s.db(), s.design, files.design, files.pcf, error)) {
+        return false;
+    }
+    s.IndexPorts();
     s.BuildDesignTree();
-    s.Recheck();
-    s.savedText = s.pcf.Text();
-    s.recoveredText = s.savedText;
+    s.ports->ApplyPins(s.db(), s.plan.Pcf());
     return true;
 }
 
 std::string Editor::RecoveryPath() const {
-    return State::RecoveryPathOf(m_state->files.pcf);
+    return m_state->plan.RecoveryPath();
 }
 
 bool Editor::HasRecovery() const {
@@ -753,52 +806,26 @@ bool Editor::HasRecovery() const {
 bool Editor::LoadRecovery(std::string& error) {
     std::lock_guard<std::mutex> hold(m_lock);
     State& s = *m_state;
-    PcfFile recovered;
-    if (!recovered.ParseFile(RecoveryPath(), error)) {
+    if (!s.plan.LoadRecovery(error)) {
         return false;
     }
-    // Lines keep the constraint file's name in messages: that is where they will go.
-    PcfFile renamed;
-    if (!renamed.Parse(recovered.Text(), s.files.pcf, error)) {
-        return false;
-    }
-    s.undo.push_back(std::move(s.pcf));
-    s.redo.clear();
-    s.pcf = std::move(renamed);
-    ++s.revision;
-    s.recoveredText = s.pcf.Text();
-    s.ownsRecovery = true;
-    s.Recheck();
+    s.ports->ApplyPins(s.db(), s.plan.Pcf());
     return true;
 }
 
 bool Editor::WriteRecovery(std::string& error) {
     std::lock_guard<std::mutex> hold(m_lock);
-    State& s = *m_state;
-    std::string text = s.pcf.Text();
-    if (text == s.savedText && s.ownsRecovery) {
-        // Undone back to the saved plan: nothing is left to recover.
-        std::error_code ec;
-        std::filesystem::remove(RecoveryPath(), ec);
-        s.ownsRecovery = false;
-        s.recoveredText = text;
-        return true;
-    }
-    if (text == s.savedText || text == s.recoveredText) {
-        return true;
-    }
-    if (!Port::WriteFileSafely(RecoveryPath(), text, error,
-                               {s.files.design, s.files.device.chipDb, s.files.pcf})) {
-        return false;
-    }
-    s.recoveredText = std::move(text);
-    s.ownsRecovery = true;
-    return true;
+    return m_state->plan.WriteRecovery(error);
 }
 
 bool Editor::Unsaved() const {
     std::lock_guard<std::mutex> hold(m_lock);
-    return m_state->Unsaved();
+    return m_state->plan.Unsaved();
+}
+
+std::size_t Editor::HistoryBytes() const {
+    std::lock_guard<std::mutex> hold(m_lock);
+    return m_state->plan.HistoryBytes();
 }
 
 EditorReply Editor::Handle(const std::string& method, const std::string& path,
@@ -806,15 +833,22 @@ EditorReply Editor::Handle(const std::string& method, const std::string& path,
     std::lock_guard<std::mutex> hold(m_lock);
     EditorReply reply;
     try {
-        reply.body = m_state->Dispatch(method, path, body)
-                         .dump(-1, ' ', false, json::error_handler_t::replace);
+        reply.body = Dump(m_state->Dispatch(method, path, body));
     } catch (const Refusal& refusal) {
         reply.status = refusal.status;
-        reply.body =
-            json{{"error", refusal.what}}.dump(-1, ' ', false, json::error_handler_t::replace);
+        json answer{{"error", refusal.what}};
+        if (refusal.changedOnDisk) {
+            answer["changedOnDisk"] = true;
+            answer["conflicts"] = refusal.conflicts;
+        }
+        reply.body = Dump(answer);
+    } catch (const json::exception& e) {
+        // A field of the wrong type: the request's fault, not the editor's.
+        reply.status = 400;
+        reply.body = Dump(json{{"error", std::string("a field has the wrong type: ") + e.what()}});
     } catch (const std::exception& e) {
         reply.status = 500;
-        reply.body = json{{"error", e.what()}}.dump(-1, ' ', false, json::error_handler_t::replace);
+        reply.body = Dump(json{{"error", e.what()}});
     }
     return reply;
 }

@@ -17,6 +17,7 @@
 //                         errors, problemPins, problemPorts.
 //                         The marks: revision, selected ids, highlighted pins {pin:
 //                         colour}, matches (ids of the last search), matchColor.
+//   GET  /api/ping        {revision}: cheap, for the page to see that the server is there.
 //   GET  /api/device      the device once: name, package, width, height, tiles
 //                         [{name,x,y,type,site,color}], pins [{id,name,bank,x,y,block,
 //                         gbuf,color}], bank colours, selected-path colours.
@@ -37,7 +38,18 @@
 //   POST /api/auto        {}: gives every port without a pin a free one.
 //   POST /api/undo        {step}: step is the revision the page shows; a stale one is
 //   POST /api/redo        refused (409), so two tabs cannot undo each other's work.
-//   POST /api/save        {}: writes the constraint file through the safe writer.
+//   POST /api/save        {}: writes the constraint file through the safe writer. When
+//                         the file on disk is no longer what was read or last saved, the
+//                         save is refused (409, changedOnDisk: true) and nothing is written.
+//   POST /api/take-disk   {reapply}: takes the constraint file as it is on disk now; with
+//                         reapply true this editor's edits go on top, port by port, and a
+//                         port whose lines the file changed too is refused (409,
+//                         changedOnDisk: true, conflicts: ["top.pcf:4: set_io ...", ...]).
+//                         Undo starts over from the file taken.
+//
+// Every change writes the recovery file before it answers; the plan's recoveryError says
+// why when that failed. Bodies nested deeper than 32 levels, fields of the wrong type and
+// invalid regular expressions are refused with 400; quoted input is cut to 200 bytes.
 //
 // The other changes answer the plan. An answer holds every field of its part, so laying it
 // over the state held before gives the state after. An assignment that would add an error
@@ -48,6 +60,7 @@
 #pragma once
 
 #include "ChipDb.h"
+#include "DeviceModel.h"
 #include "DeviceOptions.h"
 #include "Pcf.h"
 #include "PinPlan.h"
@@ -77,10 +90,14 @@ public:
     Editor(const Editor&) = delete;
     Editor& operator=(const Editor&) = delete;
 
-    /// Reads the three files. False with a one-line reason naming file and line.
+    /// Reads the three files. False with a one-line reason naming file and line; a netlist
+    /// whose port names hold control bytes is refused.
     bool Open(const EditorFiles& files, std::string& error);
+    /// The same with the device opened already (as the commands open it).
+    bool Open(const EditorFiles& files, std::unique_ptr<DeviceModel> device, std::string& error);
 
-    /// Where unsaved work goes: beside the constraint file.
+    /// Where unsaved work goes: beside the constraint file, "P.recovery", or for names too
+    /// long for that a cut of the name with a hash of it.
     std::string RecoveryPath() const;
     /// Whether a recovery file from an earlier session exists.
     bool HasRecovery() const;
@@ -92,6 +109,8 @@ public:
     bool WriteRecovery(std::string& error);
     /// Whether there is work the constraint file does not hold.
     bool Unsaved() const;
+    /// Bytes the undo and redo history holds.
+    std::size_t HistoryBytes() const;
 
     /// Serves one API request under the lock.
     EditorReply Handle(const std::string& method, const std::string& path, const std::string& body);

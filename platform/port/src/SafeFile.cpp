@@ -39,6 +39,12 @@ std::string Hex(std::uint32_t value) {
     return text;
 }
 
+std::string Octal(unsigned value) {
+    char text[16];
+    std::snprintf(text, sizeof text, "%04o", value);
+    return text;
+}
+
 std::string FolderOf(const std::string& path) {
     const auto slash = path.find_last_of('/');
     if (slash == std::string::npos) {
@@ -214,11 +220,15 @@ struct SafeWriter::State {
         return true;
     }
 
-    // The replaced file's owner, group and mode for the temporary that replaces it.
+    // The replaced file's owner, group and mode for the temporary that replaces it. A
+    // replacement that would change the owner is refused: the file would silently become
+    // the writer's, and its owner would lose it.
     bool TakeOwnerAndMode(const struct stat& info, std::string& error) {
-        // Owner and group can only be given away with the privilege to; the mode always.
         if (info.st_uid != ::geteuid() || info.st_gid != ::getegid()) {
-            (void)!::fchown(fd, info.st_uid, info.st_gid);
+            if (::fchown(fd, info.st_uid, info.st_gid) != 0 && info.st_uid != ::geteuid()) {
+                return Fail(error, "it belongs to user " + std::to_string(info.st_uid) +
+                                       ", and replacing it would make it yours");
+            }
         }
         if (::fchmod(fd, info.st_mode & 07777) != 0) {
             return Fail(error, Reason(errno));
@@ -251,6 +261,28 @@ struct SafeWriter::State {
 };
 
 namespace {
+
+// Whether the user may write the file `info` describes by its own mode bits. The folder
+// lets the file be replaced whatever its mode; a replacement would then defeat what its
+// owner asked for. The superuser passes every permission check, so for it the bits say
+// only whether anyone at all was meant to write the file: a read-only file (no write bit)
+// is refused for it too.
+bool WritableByMode(const struct stat& info) {
+    const mode_t mode = info.st_mode;
+    if (::geteuid() == 0) {
+        return (mode & (S_IWUSR | S_IWGRP | S_IWOTH)) != 0;
+    }
+    if (info.st_uid == ::geteuid()) {
+        return (mode & S_IWUSR) != 0;
+    }
+    bool inGroup = info.st_gid == ::getegid();
+    gid_t groups[256];
+    const int count = ::getgroups(256, groups);
+    for (int i = 0; i < count && !inGroup; ++i) {
+        inGroup = groups[i] == info.st_gid;
+    }
+    return (mode & (inGroup ? S_IWGRP : S_IWOTH)) != 0;
+}
 
 // Why the file `info` describes must not be written: it is one of the inputs, by name or
 // by identity. Empty when it is none of them.
@@ -316,6 +348,10 @@ bool SafeWriter::Open(const std::string& target, std::string& error,
         }
         if (!S_ISREG(info.st_mode)) {
             return s.Fail(error, "it is " + KindName(info.st_mode));
+        }
+        if (!WritableByMode(info)) {
+            return s.Fail(error, "it is read-only for you (mode " + Octal(info.st_mode & 07777) +
+                                     "); change its mode to replace it");
         }
         if (!s.ResolveFinal(link, error)) {
             return false;

@@ -10,8 +10,12 @@
 //     legal target name works), created exclusively and never through a link;
 //   - Commit() syncs the temporary, renames it over the target and syncs the folder: a
 //     crash or a kill leaves either the old file or the new one, whole;
-//   - a replaced file keeps its mode (and, where permitted, its owner and group); a new
-//     one gets 0666 less the umask;
+//   - a replaced file keeps its mode, owner and group (a group that cannot be given
+//     back is the writer's); a new one gets 0666 less the umask;
+//   - a file its mode does not let the user write (0444; another owner's 0644 in a
+//     writable folder) is refused, although the folder would allow replacing it, and
+//     so is another owner's file whose owner could not be kept; for the superuser only
+//     a file with no write bit at all is refused;
 //   - a link to a regular file replaces the file it points to and the link stays;
 //   - a target that is the same file as one of the inputs (same device and inode, however
 //     it is spelled) is refused before anything is written;

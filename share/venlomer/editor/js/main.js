@@ -1,5 +1,5 @@
 // The editor page: draws what the server answers and sends what the user does.
-import { get, post } from './api.js';
+import { get, onGone, post } from './api.js';
 import { Floorplan } from './floorplan.js';
 import { Tree } from './tree.js';
 
@@ -146,8 +146,54 @@ function undo(redo) {
   act(post(redo ? '/api/redo' : '/api/undo', { step: state.revision }));
 }
 
-function save() {
-  act(post('/api/save'));
+async function save() {
+  try {
+    render({ ...state, ...await post('/api/save') });
+  } catch (error) {
+    if (error.data?.changedOnDisk) {
+      conflict(error.data);
+    } else {
+      show(error);
+    }
+  }
+}
+
+// Save found the file changed by someone else: the user chooses what to keep.
+function conflict(data) {
+  $('conflictText').textContent = data.error;
+  const lines = $('conflictLines');
+  lines.replaceChildren(...(data.conflicts || []).map((line) => element('li', { textContent: line })));
+  $('reapply').disabled = (data.conflicts || []).length > 0;
+  $('conflict').hidden = false;
+}
+
+async function takeDisk(reapply) {
+  try {
+    render({ ...state, ...await post('/api/take-disk', { reapply }) });
+    $('conflict').hidden = true;
+  } catch (error) {
+    if (error.data?.changedOnDisk) {
+      conflict(error.data);
+    } else {
+      show(error);
+    }
+  }
+}
+
+// While the server is gone the page is covered, so that nothing looks editable, and asks
+// every 2 seconds; when it answers again the page starts over from its state.
+function watchServer() {
+  onGone((gone) => {
+    $('gone').hidden = !gone;
+    document.body.dataset.gone = String(gone);
+    clearInterval(watchServer.timer);
+    if (gone) {
+      watchServer.timer = setInterval(() => get('/api/ping').catch(() => {}), 2000);
+    } else if (state) {
+      location.reload();
+    }
+  });
+  setInterval(() => { if ($('gone').hidden) get('/api/ping').catch(() => {}); }, 5000);
 }
 
 function keys(event) {
@@ -187,9 +233,13 @@ async function start() {
   $('redo').addEventListener('click', () => undo(true));
   $('auto').addEventListener('click', () => act(post('/api/auto')));
   $('save').addEventListener('click', save);
+  $('reapply').addEventListener('click', () => takeDisk(true));
+  $('takeDisk').addEventListener('click', () => takeDisk(false));
+  $('keepEditing').addEventListener('click', () => { $('conflict').hidden = true; });
   document.addEventListener('keydown', keys);
   render(state);
   document.body.dataset.ready = 'true';
 }
 
+watchServer();
 start().catch(show);
