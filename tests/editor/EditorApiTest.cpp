@@ -372,3 +372,21 @@ TEST_F(EditorApi, ConcurrentClientsAreServedOneAtATime) {
 }
 
 } // namespace
+
+TEST_F(EditorApi, ServesTheCompareFlagsItTakesAndThePlanAsATable) {
+    // The page offers what the server lists; every word listed must be one the search takes.
+    json flags = Get("/api/flags")["flags"];
+    ASSERT_TRUE(flags.is_array());
+    EXPECT_NE(std::find(flags.begin(), flags.end(), "any"), flags.end());
+    for (const json& flag : flags) {
+        Post("/api/search", {{"property", "Name"}, {"value", "1"}, {"flags", {flag}}});
+    }
+
+    // The same table as `pins export --csv`, with led[0] on the pin the fixture gave it.
+    auto table = m_client->Get("/api/export.csv");
+    ASSERT_TRUE(table);
+    EXPECT_EQ(table->status, 200);
+    EXPECT_EQ(table->get_header_value("Content-Type").rfind("text/csv", 0), 0u);
+    EXPECT_EQ(table->body.rfind("port,direction,pin,bank,", 0), 0u) << table->body;
+    EXPECT_NE(table->body.find("\nled[0],output,1,"), std::string::npos) << table->body;
+}

@@ -28,7 +28,8 @@ for command in $commands; do
     "$venlomer" "$command" --help >/dev/null 2>&1 || fail "offered $command, which is no command"
 done
 [[ $(offer --verbose fl) == floorplan ]] || fail "--verbose before the command hides the commands"
-[[ $(offer pins "" | tr '\n' ' ') == "assign check show " ]] || fail "pins offers: $(offer pins "")"
+[[ $(offer pins "" | tr '\n' ' ') == "assign check export from-board import show " ]] ||
+    fail "pins offers: $(offer pins "")"
 
 floorplan_options=$(offer floorplan --)
 for expected in --chipdb --device --package --find --flags --svg --help; do
@@ -37,7 +38,7 @@ done
 for option in $floorplan_options; do
     "$venlomer" floorplan --help | grep -q -- "^  $option\b" || fail "floorplan offers $option"
 done
-[[ $(offer pins assign --a) == --auto ]] || fail "pins assign --a offers: $(offer pins assign --a)"
+[[ $(offer pins assign --au) == --auto ]] || fail "pins assign --au offers: $(offer pins assign --au)"
 
 scratch=$(mktemp -d) && trap 'rm -rf "$scratch"' EXIT
 touch "$scratch/top.pcf"

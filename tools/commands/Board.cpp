@@ -184,7 +184,7 @@ int WritePlan(const std::string& command, const BoardPlan& plan, const PcfFile& 
         return kExitOk;
     }
     std::string error;
-    if (!Port::WriteFileSafely(plan.pcfPath, text, error, plan.inputs)) {
+    if (!WriteTextFile(plan.pcfPath, text, error, plan.inputs)) {
         return Refused(command, error);
     }
     std::size_t lines = 0;
@@ -290,7 +290,7 @@ int RunExport(const ParsedArgs& args) {
     }
     std::string error;
     plan.inputs.push_back(plan.pcfPath);
-    if (!Port::WriteFileSafely(out, csv, error, plan.inputs)) {
+    if (!WriteTextFile(out, csv, error, plan.inputs)) {
         return Refused(kExport, error);
     }
     std::printf("Wrote %s: %zu ports\n", out.c_str(), plan.design.ports.size());

@@ -147,8 +147,8 @@ int RunCheck(const ParsedArgs& args) {
     std::size_t placed = 0;
     for (VnI::IPropertyHolder* holder : ports.List()) {
         std::string name = holder->GetName().str();
-        std::string pin = ValueText(holder->GetPropertyByName("Pin"));
-        std::string bank = ValueText(holder->GetPropertyByName("Bank"));
+        std::string pin = PropertyText(holder->GetPropertyByName("Pin"));
+        std::string bank = PropertyText(holder->GetPropertyByName("Bank"));
         auto counts = countOfPort.find(name);
         int errors = counts != countOfPort.end() ? counts->second.first : 0;
         int warnings = counts != countOfPort.end() ? counts->second.second : 0;
@@ -161,8 +161,8 @@ int RunCheck(const ParsedArgs& args) {
                     Count(static_cast<std::size_t>(warnings), "warning", "warnings");
         }
         placed += pin.empty() ? 0 : 1;
-        rows.push_back({Port::Printable(name), ValueText(holder->GetPropertyByName("Direction")),
-                        ValueText(holder->GetPropertyByName("Clock")),
+        rows.push_back({Port::Printable(name), PropertyText(holder->GetPropertyByName("Direction")),
+                        PropertyText(holder->GetPropertyByName("Clock")),
                         pin.empty() ? "-" : Port::Printable(pin), bank == "-1" ? "-" : bank,
                         said.empty() ? "ok" : said});
     }
@@ -415,7 +415,7 @@ int RunAssign(const ParsedArgs& args) {
     }
     std::string error;
     if (!StillAsRead(plan, error) ||
-        !Port::WriteFileSafely(plan.pcfPath, text, error, {plan.designPath, plan.source.chipDb})) {
+        !WriteTextFile(plan.pcfPath, text, error, {plan.designPath, plan.source.chipDb})) {
         return Refused(kAssign, error);
     }
     std::size_t lines = 0;
@@ -483,7 +483,7 @@ int RunShow(const ParsedArgs& args) {
     for (const auto& problem : problems) {
         std::string pin = problem.pin;
         if (pin.empty() && ports.Find(problem.port) != nullptr) {
-            pin = ValueText(ports.Find(problem.port)->GetPropertyByName("Pin"));
+            pin = PropertyText(ports.Find(problem.port)->GetPropertyByName("Pin"));
         }
         int index = pinIndex(pin);
         if (index < 0) {
@@ -523,7 +523,7 @@ int RunShow(const ParsedArgs& args) {
             if (match->GetPropertyNames() != ports.Names()) {
                 resources.push_back(match);
             } else if (DeviceHolder* pin =
-                           model.FindPin(ValueText(match->GetPropertyByName("Pin")))) {
+                           model.FindPin(PropertyText(match->GetPropertyByName("Pin")))) {
                 resources.push_back(pin);
             }
         }

@@ -5,7 +5,9 @@
 
 #include "CompareFlags.h"
 #include "DeviceModel.h"
+#include "PinCsv.h"
 #include "PortHolders.h"
+#include "PropertyText.h"
 
 #include "CommonI/RefCountPtr.h"
 #include "Port/Regexp.h"
@@ -74,19 +76,6 @@ bool TooDeep(const std::string& body) {
         }
     }
     return false;
-}
-
-std::string ColorHex(const Ptr<VnI::IColorProperty>& color) {
-    if (!color || !color->IsValid()) {
-        return "";
-    }
-    static const char digits[] = "0123456789abcdef";
-    std::string hex = "#";
-    for (std::uint8_t part : {color->GetRed(), color->GetGreen(), color->GetBlue()}) {
-        hex += digits[part >> 4];
-        hex += digits[part & 15];
-    }
-    return hex;
 }
 
 json ValueOf(const Ptr<VnI::IProperty>& property) {
@@ -376,7 +365,7 @@ struct Editor::State {
         }
         state["highlighted"] = std::move(lit);
         // A match is shown in the first selected-path colour, as the pin view rings it.
-        state["matchColor"] = ColorHex(Vn::Eng::ColorManager::GetSelectedPathColor(0));
+        state["matchColor"] = HexColour(Vn::Eng::ColorManager::GetSelectedPathColor(0));
         return state;
     }
 
@@ -493,30 +482,13 @@ struct Editor::State {
         if (position < 0) {
             return nullptr;
         }
-        VnI::IPropertyName* name = names->GetPropertyName(position);
-        switch (name->GetType()) {
-        case VnI::INT_TYPE: {
-            int number = 0;
-            auto [end, ec] = std::from_chars(value.data(), value.data() + value.size(), number);
-            if (ec != std::errc() || end != value.data() + value.size()) {
-                throw Refusal{400, property + " is a whole number; got \"" + Quoted(value) + "\""};
-            }
-            return Ptr<VnI::IProperty>::Adopt(
-                Vn::Eng::PropertyFactory::CreateIntProperty(number, true));
+        std::string error;
+        Ptr<VnI::IProperty> wanted =
+            TypedValue(names->GetPropertyName(position)->GetType(), property, value, error);
+        if (!wanted) {
+            throw Refusal{400, Quoted(error)};
         }
-        case VnI::BOOL_TYPE: {
-            bool yes = value == "yes" || value == "true" || value == "1";
-            if (!yes && value != "no" && value != "false" && value != "0") {
-                throw Refusal{400, property + " is yes or no; got \"" + Quoted(value) + "\""};
-            }
-            return Ptr<VnI::IProperty>::Adopt(
-                Vn::Eng::PropertyFactory::CreateBoolProperty(yes, true));
-        }
-        // An enumerated holder property compares its text with a string's.
-        default:
-            return Ptr<VnI::IProperty>::Adopt(
-                Vn::Eng::PropertyFactory::CreateStringProperty(value.c_str(), true));
-        }
+        return wanted;
     }
 
     // Runs the library's search over one kind of holder; appends the matches.
@@ -673,6 +645,7 @@ struct Editor::State {
         // path -> (whether it is a POST, what serves it)
         static const std::map<std::string, std::pair<bool, Route>> routes{
             {"/api/ping", {false, &State::GetPing}},
+            {"/api/flags", {false, &State::GetFlags}},
             {"/api/state", {false, &State::GetState}},
             {"/api/device", {false, &State::GetDevice}},
             {"/api/tree", {false, &State::GetTree}},
@@ -691,6 +664,16 @@ struct Editor::State {
     }
 
     json GetPing(const json&) { return {{"revision", plan.Revision()}}; }
+    // The compare-flag words the search takes, so the page offers exactly these.
+    json GetFlags(const json&) {
+        json words = json::array();
+        for (const CompareFlagWord& flag : CompareFlagTable()) {
+            words.push_back(flag.word);
+        }
+        return {{"flags", words}};
+    }
+    // The plan as the table `pins export --csv` writes, for the page's download.
+    std::string PlanTable() const { return PlanCsv(db(), design, files.design, plan.Pcf()); }
     json GetState(const json&) { return StateJson(); }
     json GetDevice(const json&) { return DeviceJson(); }
     json GetTree(const json&) { return TreeJson(); }
@@ -833,6 +816,11 @@ EditorReply Editor::Handle(const std::string& method, const std::string& path,
     std::lock_guard<std::mutex> hold(m_lock);
     EditorReply reply;
     try {
+        if (method == "GET" && path == "/api/export.csv") {
+            reply.body = m_state->PlanTable();
+            reply.type = "text/csv; charset=utf-8";
+            return reply;
+        }
         reply.body = Dump(m_state->Dispatch(method, path, body));
     } catch (const Refusal& refusal) {
         reply.status = refusal.status;

@@ -80,7 +80,8 @@ struct EditorFiles {
 
 struct EditorReply {
     int status = 200;
-    std::string body; ///< JSON
+    std::string body;                      ///< JSON, but for the plan table
+    std::string type = "application/json"; ///< what `body` is
 };
 
 class Editor {

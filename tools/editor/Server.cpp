@@ -280,6 +280,7 @@ struct EditorServer::Imp {
         EditorReply reply = editor.Handle(request.method, request.path, request.body);
         Response response;
         response.status = reply.status;
+        response.type = std::move(reply.type);
         response.body = std::move(reply.body);
         return response;
     }

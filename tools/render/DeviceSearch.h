@@ -64,11 +64,6 @@ void SelectAndHighlight(DeviceModel& model, const std::vector<VnI::IPropertyHold
 void SearchDevice(DeviceModel& model, const SearchRequest& request,
                   const CommonI::RefCountPtr<VnI::IProperty>& wanted);
 
-/// PropertyText under the name the pins commands still call it by.
-inline std::string ValueText(const CommonI::RefCountPtr<VnI::IProperty>& property) {
-    return PropertyText(property);
-}
-
 /// Prints a table: the header row, then the rows, columns padded to their widest cell.
 void PrintTable(const std::vector<std::string>& columns,
                 const std::vector<std::vector<std::string>>& rows);

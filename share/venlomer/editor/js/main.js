@@ -3,7 +3,8 @@ import { get, onGone, post } from './api.js';
 import { Floorplan } from './floorplan.js';
 import { Tree } from './tree.js';
 
-const FLAGS = ['exact', 'ignore-case', 'substring', 'regexp', 'less', 'greater', 'within-5-percent'];
+// The compare-flag words come from the server, which is what judges them.
+let FLAGS = [];
 const $ = (id) => document.getElementById(id);
 
 let state = null;
@@ -215,6 +216,7 @@ function keys(event) {
 }
 
 async function start() {
+  FLAGS = (await get('/api/flags')).flags;
   for (const flag of FLAGS) {
     const box = element('input', { type: 'checkbox', id: `flag-${flag}`, checked: flag === 'exact' });
     $('flags').append(element('label', {}, box, ` ${flag}`));
