@@ -30,6 +30,8 @@ const char kCheck[] = "pins check";
 const char kAssign[] = "pins assign";
 const char kShow[] = "pins show";
 
+using Assignments = std::vector<std::pair<std::string, std::string>>;
+
 // What every pins command reads.
 struct Plan {
     DeviceSource source;
@@ -203,8 +205,7 @@ bool StillAsRead(const Plan& plan, std::string& error) {
 }
 
 // PORT=PIN operands; a port given twice is a slip of the command line, not a plan.
-int ReadAssignments(const ParsedArgs& args,
-                    std::vector<std::pair<std::string, std::string>>& wanted) {
+int ReadAssignments(const ParsedArgs& args, Assignments& wanted) {
     std::unordered_set<std::string> seen;
     for (const std::string& operand : args.operands) {
         auto eq = operand.find('=');
@@ -221,8 +222,7 @@ int ReadAssignments(const ParsedArgs& args,
 }
 
 // Why the wanted assignments cannot be made, or empty.
-std::string CheckWanted(const Plan& plan,
-                        const std::vector<std::pair<std::string, std::string>>& wanted) {
+std::string CheckWanted(const Plan& plan, const Assignments& wanted) {
     const ChipDb& db = plan.model->Db();
     std::unordered_set<std::string> designPorts;
     std::vector<std::string> portNames;
@@ -249,8 +249,7 @@ std::string CheckWanted(const Plan& plan,
 
 // A pin the user asks for that another port of the design holds: told from the user's
 // side, naming the holder, whichever of the two lines comes first in the file.
-std::string CheckHeld(const Plan& plan, const PcfFile& result,
-                      const std::vector<std::pair<std::string, std::string>>& wanted) {
+std::string CheckHeld(const Plan& plan, const PcfFile& result, const Assignments& wanted) {
     std::unordered_set<std::string> designPorts;
     for (const auto& port : plan.design.ports) {
         designPorts.insert(port.name);
@@ -341,59 +340,56 @@ std::string FirstErrorAndCount(const std::vector<PinProblem>& problems) {
                 : "");
 }
 
-int RunAssign(const ParsedArgs& args) {
-    std::vector<std::pair<std::string, std::string>> wanted;
-    if (int status = ReadAssignments(args, wanted); status != kExitOk) {
+// What pins assign was asked to change.
+struct AssignRequest {
+    Assignments wanted;
+    std::vector<std::string> unassign;
+    bool autoAssign = false;
+};
+
+int ReadRequest(const ParsedArgs& args, AssignRequest& request) {
+    if (int status = ReadAssignments(args, request.wanted); status != kExitOk) {
         return status;
     }
-    std::vector<std::string> unassign = args.Values("--unassign");
-    bool autoAssign = args.Has("--auto");
-    if (wanted.empty() && unassign.empty() && !autoAssign) {
+    request.unassign = args.Values("--unassign");
+    request.autoAssign = args.Has("--auto");
+    if (request.wanted.empty() && request.unassign.empty() && !request.autoAssign) {
         return UsageError(kAssign, "nothing to do: give PORT=PIN, --unassign PORT or --auto");
     }
-    Plan plan;
-    if (int status = Load(kAssign, args, true, plan); status != kExitOk) {
-        return status;
+    return kExitOk;
+}
+
+// The plan's constraint file with the request made in it, and the pins --auto chose into
+// `given`; returns why the request cannot be made, or empty.
+std::string ApplyRequest(const Plan& plan, const AssignRequest& request, PcfFile& result,
+                         Assignments& given) {
+    if (std::string why = CheckWanted(plan, request.wanted); !why.empty()) {
+        return why;
     }
-    auto refuse = [&](const std::string& why) {
-        return Refused(kAssign, why + "; " + plan.pcfPath + " left untouched");
-    };
-    if (std::string why = CheckWanted(plan, wanted); !why.empty()) {
-        return refuse(why);
-    }
-    PcfFile result = plan.pcf;
-    for (const std::string& port : unassign) {
+    result = plan.pcf;
+    for (const std::string& port : request.unassign) {
         if (result.Unassign(port) == 0) {
-            return refuse("port '" + port + "' has no set_io line to remove");
+            return "port '" + port + "' has no set_io line to remove";
         }
     }
-    for (const auto& [port, pin] : wanted) {
+    for (const auto& [port, pin] : request.wanted) {
         result.Assign(port, pin);
     }
-    if (std::string why = CheckHeld(plan, result, wanted); !why.empty()) {
-        return refuse(why);
+    if (std::string why = CheckHeld(plan, result, request.wanted); !why.empty()) {
+        return why;
     }
-    std::vector<std::pair<std::string, std::string>> given;
-    if (autoAssign) {
+    if (request.autoAssign) {
         if (std::string why = CheckRoom(plan, result); !why.empty()) {
-            return refuse(why);
+            return why;
         }
         given = AutoAssign(plan.model->Db(), plan.design, result);
     }
-    // A plan being built port by port has ports still to place; with --auto every port
-    // has a pin, so an unconstrained one is the error nextpnr-ice40 would make it.
-    CheckOptions reading = ReadingOf(args);
-    reading.allowUnconstrained = reading.allowUnconstrained || !autoAssign;
-    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, result, reading);
-    if (HasErrors(problems)) {
-        return refuse(FirstErrorAndCount(problems));
-    }
-    std::string text = result.Text();
-    if (std::string why = CheckWritable(result, text); !why.empty()) {
-        return refuse(why);
-    }
+    return {};
+}
+
+void PrintAssignments(const Plan& plan, const AssignRequest& request, const Assignments& given) {
     PrintDevice(plan);
-    for (const std::string& port : unassign) {
+    for (const std::string& port : request.unassign) {
         std::printf("  %s: unassigned\n", Port::Printable(port).c_str());
     }
     auto describe = [&](const std::string& port, const std::string& pin) {
@@ -402,13 +398,16 @@ int RunAssign(const ParsedArgs& args) {
                     Port::Printable(pin).c_str(), plan.model->PinOf(holder).bank,
                     plan.model->IsGlobalBufferPin(holder) ? ", global buffer" : "");
     };
-    for (const auto& [port, pin] : wanted) {
+    for (const auto& [port, pin] : request.wanted) {
         describe(port, pin);
     }
     for (const auto& [port, pin] : given) {
         describe(port, pin);
     }
-    PrintProblems(problems);
+}
+
+// Writes the checked plan, unless the file already says it.
+int WritePlan(const Plan& plan, const PcfFile& result, const std::string& text) {
     if (plan.pcfExisted && text == plan.pcf.Text()) {
         std::printf("%s unchanged\n", plan.pcfPath.c_str());
         return kExitOk;
@@ -427,14 +426,46 @@ int RunAssign(const ParsedArgs& args) {
     return kExitOk;
 }
 
+int RunAssign(const ParsedArgs& args) {
+    AssignRequest request;
+    if (int status = ReadRequest(args, request); status != kExitOk) {
+        return status;
+    }
+    Plan plan;
+    if (int status = Load(kAssign, args, true, plan); status != kExitOk) {
+        return status;
+    }
+    auto refuse = [&](const std::string& why) {
+        return Refused(kAssign, why + "; " + plan.pcfPath + " left untouched");
+    };
+    PcfFile result;
+    Assignments given;
+    if (std::string why = ApplyRequest(plan, request, result, given); !why.empty()) {
+        return refuse(why);
+    }
+    // A plan being built port by port has ports still to place; with --auto every port
+    // has a pin, so an unconstrained one is the error nextpnr-ice40 would make it.
+    CheckOptions reading = ReadingOf(args);
+    reading.allowUnconstrained = reading.allowUnconstrained || !request.autoAssign;
+    auto problems = CheckPins(plan.model->Db(), plan.design, plan.designPath, result, reading);
+    if (HasErrors(problems)) {
+        return refuse(FirstErrorAndCount(problems));
+    }
+    std::string text = result.Text();
+    if (std::string why = CheckWritable(result, text); !why.empty()) {
+        return refuse(why);
+    }
+    PrintAssignments(plan, request, given);
+    PrintProblems(problems);
+    return WritePlan(plan, result, text);
+}
+
 // ---- show ------------------------------------------------------------------------------
 
-int RunShow(const ParsedArgs& args) {
-    SearchRequest search;
+int ReadShowArgs(const ParsedArgs& args, SearchRequest& search, DrawRequest& draw) {
     if (int status = ParseSearchArgs(kShow, args, search); status != kExitOk) {
         return status;
     }
-    DrawRequest draw;
     if (int status = ParseViewArgs(kShow, args, draw); status != kExitOk) {
         return status;
     }
@@ -443,6 +474,88 @@ int RunShow(const ParsedArgs& args) {
     draw.svg = args.Value("--svg", "pins.svg");
     if (draw.svg.empty()) {
         return UsageError(kShow, "--svg wants a file name");
+    }
+    return kExitOk;
+}
+
+// Labels every pin with the design ports the file puts on it, then marks the pins a
+// problem names (a port's problem falls on the pin it is on) with the first such problem.
+void MarkPlan(const DeviceModel& model, const PortHolders& ports, const PcfFile& pcf,
+              const std::vector<PinProblem>& problems, std::map<int, PinMark>& marks) {
+    auto pinIndex = [&](const std::string& pin) {
+        DeviceHolder* holder = model.FindPin(pin);
+        return holder != nullptr ? holder->GetIndex() : -1;
+    };
+    for (const auto& line : pcf.Lines()) {
+        int index = line.kind == PcfLine::Kind::SetIo && ports.Find(line.port) != nullptr
+                        ? pinIndex(line.pin)
+                        : -1;
+        if (index >= 0) {
+            PinMark& mark = marks[index];
+            mark.label += (mark.label.empty() ? "" : ",") + line.port;
+        }
+    }
+    for (const auto& problem : problems) {
+        std::string pin = problem.pin;
+        if (pin.empty() && ports.Find(problem.port) != nullptr) {
+            pin = PropertyText(ports.Find(problem.port)->GetPropertyByName("Pin"));
+        }
+        int index = pinIndex(pin);
+        if (index < 0) {
+            continue;
+        }
+        PinMark& mark = marks[index];
+        if (mark.status != PinMark::Status::Problem) {
+            mark.status = PinMark::Status::Problem;
+            mark.reason = problem.message;
+        }
+        if (mark.label.empty()) {
+            mark.label = problem.port;
+        }
+    }
+}
+
+void PrintPinCounts(const DeviceModel& model, const std::map<int, PinMark>& marks) {
+    std::size_t problemPins = 0;
+    for (const auto& [index, mark] : marks) {
+        problemPins += mark.status == PinMark::Status::Problem ? 1 : 0;
+    }
+    std::printf("Pins: %zu assigned, %zu with problems, %zu free\n", marks.size() - problemPins,
+                problemPins, model.Pins().size() - marks.size());
+}
+
+// Searches banks, pins and ports together and highlights what matched.
+void SearchPlan(DeviceModel& model, PortHolders& ports, const SearchRequest& search,
+                const CommonI::RefCountPtr<VnI::IProperty>& wanted,
+                const std::vector<SearchKind>& kinds) {
+    std::vector<VnI::IPropertyHolder*> candidates(model.Banks().begin(), model.Banks().end());
+    candidates.insert(candidates.end(), model.Pins().begin(), model.Pins().end());
+    for (VnI::IPropertyHolder* port : ports.List()) {
+        candidates.push_back(port);
+    }
+    std::string over = std::to_string(model.Banks().size()) + " banks, " +
+                       std::to_string(model.Pins().size()) + " pins and " +
+                       std::to_string(ports.Size()) + " ports";
+    auto matches = SearchAndPrint(search, wanted, candidates, kinds, over);
+    // A matched port stands for the pin it is on: the device's managers hold device
+    // resources only.
+    std::vector<VnI::IPropertyHolder*> resources;
+    for (VnI::IPropertyHolder* match : matches) {
+        if (match->GetPropertyNames() != ports.Names()) {
+            resources.push_back(match);
+        } else if (DeviceHolder* pin =
+                       model.FindPin(PropertyText(match->GetPropertyByName("Pin")))) {
+            resources.push_back(pin);
+        }
+    }
+    SelectAndHighlight(model, resources);
+}
+
+int RunShow(const ParsedArgs& args) {
+    SearchRequest search;
+    DrawRequest draw;
+    if (int status = ReadShowArgs(args, search, draw); status != kExitOk) {
+        return status;
     }
     Plan plan;
     if (int status = Load(kShow, args, false, plan); status != kExitOk) {
@@ -466,68 +579,11 @@ int RunShow(const ParsedArgs& args) {
     }
     auto problems = CheckPins(model.Db(), plan.design, plan.designPath, plan.pcf, ReadingOf(args));
     PrintDevice(plan);
-
-    auto pinIndex = [&](const std::string& pin) {
-        DeviceHolder* holder = model.FindPin(pin);
-        return holder != nullptr ? holder->GetIndex() : -1;
-    };
-    for (const auto& line : plan.pcf.Lines()) {
-        int index = line.kind == PcfLine::Kind::SetIo && ports.Find(line.port) != nullptr
-                        ? pinIndex(line.pin)
-                        : -1;
-        if (index >= 0) {
-            PinMark& mark = draw.marks[index];
-            mark.label += (mark.label.empty() ? "" : ",") + line.port;
-        }
-    }
-    for (const auto& problem : problems) {
-        std::string pin = problem.pin;
-        if (pin.empty() && ports.Find(problem.port) != nullptr) {
-            pin = PropertyText(ports.Find(problem.port)->GetPropertyByName("Pin"));
-        }
-        int index = pinIndex(pin);
-        if (index < 0) {
-            continue;
-        }
-        PinMark& mark = draw.marks[index];
-        if (mark.status != PinMark::Status::Problem) {
-            mark.status = PinMark::Status::Problem;
-            mark.reason = problem.message;
-        }
-        if (mark.label.empty()) {
-            mark.label = problem.port;
-        }
-    }
-    std::size_t problemPins = 0;
-    for (const auto& [index, mark] : draw.marks) {
-        problemPins += mark.status == PinMark::Status::Problem ? 1 : 0;
-    }
-    std::printf("Pins: %zu assigned, %zu with problems, %zu free\n",
-                draw.marks.size() - problemPins, problemPins,
-                model.Pins().size() - draw.marks.size());
+    MarkPlan(model, ports, plan.pcf, problems, draw.marks);
+    PrintPinCounts(model, draw.marks);
     PrintProblems(problems);
     if (search.active) {
-        std::vector<VnI::IPropertyHolder*> candidates(model.Banks().begin(), model.Banks().end());
-        candidates.insert(candidates.end(), model.Pins().begin(), model.Pins().end());
-        for (VnI::IPropertyHolder* port : ports.List()) {
-            candidates.push_back(port);
-        }
-        std::string over = std::to_string(model.Banks().size()) + " banks, " +
-                           std::to_string(model.Pins().size()) + " pins and " +
-                           std::to_string(ports.Size()) + " ports";
-        auto matches = SearchAndPrint(search, wanted, candidates, kinds, over);
-        // A matched port stands for the pin it is on: the device's managers hold device
-        // resources only.
-        std::vector<VnI::IPropertyHolder*> resources;
-        for (VnI::IPropertyHolder* match : matches) {
-            if (match->GetPropertyNames() != ports.Names()) {
-                resources.push_back(match);
-            } else if (DeviceHolder* pin =
-                           model.FindPin(PropertyText(match->GetPropertyByName("Pin")))) {
-                resources.push_back(pin);
-            }
-        }
-        SelectAndHighlight(model, resources);
+        SearchPlan(model, ports, search, wanted, kinds);
         draw.title = ", search " + search.name + "=" + search.value;
     }
     draw.inputs = {plan.source.chipDb, plan.designPath, plan.pcfPath};

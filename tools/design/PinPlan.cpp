@@ -611,6 +611,153 @@ void PlaceHardBlockPorts(const ChipDb& db, const Design& design, const PcfFile& 
     }
 }
 
+using PinList = std::vector<const Pin*>;
+using PortList = std::vector<const DesignPort*>;
+
+// One auto-assignment under way: the free pins in the order they are handed out
+// (ordinary pins first, global-buffer pins kept for the clocks and for last), the pins
+// handed out and the ports that have one.
+class PinGiver {
+public:
+    PinGiver(const ChipDb& db, const std::set<std::string>& taken);
+
+    void Give(const DesignPort& port, const Pin* pin);
+    // Clock and global-buffer ports onto global-buffer pins.
+    void PlaceClocks(const PortList& open);
+    // Each bus's open bits together in one bank; returns the ports still without a pin.
+    PortList PlaceBuses(const PortList& open);
+    // Every port left on the first free pin.
+    void PlaceRest(const PortList& rest);
+
+    std::set<const Pin*>& Used() { return m_used; }
+    const std::vector<std::pair<std::string, std::string>>& Given() const { return m_given; }
+
+private:
+    bool Placed(const DesignPort& port) const { return m_placed.count(port.name) != 0; }
+    const Pin* FirstFree(const PinList& list);
+    PinList BankFor(const PinList& candidates, std::size_t count) const;
+    bool PlaceBus(const PortList& bits);
+
+    PinList m_ordinary;
+    PinList m_global;
+    PinList m_everyFree;
+    std::set<const Pin*> m_used;
+    std::set<std::string> m_placed;
+    std::vector<std::pair<std::string, std::string>> m_given;
+    // Pins are only ever taken, so each list is walked once from where the last search
+    // stopped.
+    std::map<const PinList*, std::size_t> m_cursor;
+};
+
+PinGiver::PinGiver(const ChipDb& db, const std::set<std::string>& taken) {
+    for (const Pin* pin : PinsInOrder(db)) {
+        if (taken.count(pin->name) == 0) {
+            (IsGlobalBufferPin(db, *pin) ? m_global : m_ordinary).push_back(pin);
+            m_everyFree.push_back(pin);
+        }
+    }
+}
+
+void PinGiver::Give(const DesignPort& port, const Pin* pin) {
+    m_used.insert(pin);
+    m_placed.insert(port.name);
+    m_given.emplace_back(port.name, pin->name);
+}
+
+const Pin* PinGiver::FirstFree(const PinList& list) {
+    std::size_t& at = m_cursor[&list];
+    while (at < list.size() && m_used.count(list[at]) != 0) {
+        ++at;
+    }
+    return at < list.size() ? list[at] : nullptr;
+}
+
+// The first bank with room for every bit, its pins in their order along the edge so that
+// neighbouring bits land on neighbouring pins; empty when none has.
+PinList PinGiver::BankFor(const PinList& candidates, std::size_t count) const {
+    for (int bank = 0; bank < 4; ++bank) {
+        PinList room;
+        for (const Pin* pin : candidates) {
+            if (pin->bank == bank && m_used.count(pin) == 0) {
+                room.push_back(pin);
+            }
+        }
+        if (room.size() >= count) {
+            std::stable_sort(room.begin(), room.end(), AlongTheEdge);
+            room.resize(count);
+            return room;
+        }
+    }
+    return {};
+}
+
+void PinGiver::PlaceClocks(const PortList& open) {
+    for (const DesignPort* port : open) {
+        if ((port->clock || port->padUse == PadUse::GlobalBuffer) && !Placed(*port)) {
+            if (const Pin* pin = FirstFree(m_global)) {
+                Give(*port, pin);
+            }
+        }
+    }
+}
+
+// Ordinary pins when a bank has enough of them, else any free pins of one bank; false
+// when no bank has room for the bits, which are then left without pins.
+bool PinGiver::PlaceBus(const PortList& bits) {
+    PinList room = BankFor(m_ordinary, bits.size());
+    if (room.empty()) {
+        room = BankFor(m_everyFree, bits.size());
+    }
+    if (room.empty()) {
+        return false;
+    }
+    for (std::size_t i = 0; i < bits.size(); ++i) {
+        Give(*bits[i], room[i]);
+    }
+    return true;
+}
+
+PortList PinGiver::PlaceBuses(const PortList& open) {
+    PortList rest;
+    std::set<std::string> busesDone;
+    for (const DesignPort* port : open) {
+        if (Placed(*port)) {
+            continue;
+        }
+        if (port->clock || port->width <= 1) {
+            rest.push_back(port);
+            continue;
+        }
+        if (!busesDone.insert(port->bus).second) {
+            continue;
+        }
+        PortList bits;
+        for (const DesignPort* other : open) {
+            if (other->bus == port->bus && !Placed(*other)) {
+                bits.push_back(other);
+            }
+        }
+        std::sort(bits.begin(), bits.end(),
+                  [](const DesignPort* a, const DesignPort* b) { return a->bit < b->bit; });
+        if (!PlaceBus(bits)) {
+            rest.insert(rest.end(), bits.begin(), bits.end());
+        }
+    }
+    return rest;
+}
+
+void PinGiver::PlaceRest(const PortList& rest) {
+    for (const DesignPort* port : rest) {
+        const Pin* pin = FirstFree(m_ordinary);
+        if (pin == nullptr) {
+            pin = FirstFree(m_global);
+        }
+        if (pin != nullptr) {
+            Give(*port, pin);
+        }
+    }
+}
+
 } // namespace
 
 std::vector<std::pair<std::string, std::string>> AutoAssign(const ChipDb& db, const Design& design,
@@ -623,118 +770,19 @@ std::vector<std::pair<std::string, std::string>> AutoAssign(const ChipDb& db, co
             constrained.insert(line.port);
         }
     }
-    // Free pins in the order they are handed out: ordinary pins first, global-buffer pins
-    // kept for the clocks and for last.
-    std::vector<const Pin*> ordinary;
-    std::vector<const Pin*> global;
-    for (const Pin* pin : PinsInOrder(db)) {
-        if (taken.count(pin->name) == 0) {
-            (IsGlobalBufferPin(db, *pin) ? global : ordinary).push_back(pin);
-        }
-    }
-    std::vector<const Pin*> everyFree;
-    for (const Pin* pin : PinsInOrder(db)) {
-        if (taken.count(pin->name) == 0) {
-            everyFree.push_back(pin);
-        }
-    }
-    std::set<const Pin*> used;
-    std::set<std::string> placed;
-    std::vector<std::pair<std::string, std::string>> given;
-    auto give = [&](const DesignPort& port, const Pin* pin) {
-        used.insert(pin);
-        placed.insert(port.name);
-        given.emplace_back(port.name, pin->name);
-    };
-    // Pins are only ever taken, so each list is walked once from where the last search
-    // stopped.
-    std::map<const std::vector<const Pin*>*, std::size_t> cursor;
-    auto firstFree = [&](const std::vector<const Pin*>& list) -> const Pin* {
-        std::size_t& at = cursor[&list];
-        while (at < list.size() && used.count(list[at]) != 0) {
-            ++at;
-        }
-        return at < list.size() ? list[at] : nullptr;
-    };
-    // The first bank with room for every bit, its pins in their order along the edge so
-    // that neighbouring bits land on neighbouring pins; empty when none has.
-    auto bankFor = [&](const std::vector<const Pin*>& candidates, std::size_t count) {
-        for (int bank = 0; bank < 4; ++bank) {
-            std::vector<const Pin*> room;
-            for (const Pin* pin : candidates) {
-                if (pin->bank == bank && used.count(pin) == 0) {
-                    room.push_back(pin);
-                }
-            }
-            if (room.size() >= count) {
-                std::stable_sort(room.begin(), room.end(), AlongTheEdge);
-                room.resize(count);
-                return room;
-            }
-        }
-        return std::vector<const Pin*>{};
-    };
-
-    std::vector<const DesignPort*> open;
+    PortList open;
     for (const DesignPort& port : design.ports) {
         if (constrained.count(port.name) == 0) {
             open.push_back(&port);
         }
     }
-    PlaceHardBlockPorts(db, design, pcf, open, taken, used, give);
-    for (const DesignPort* port : open) {
-        if ((port->clock || port->padUse == PadUse::GlobalBuffer) &&
-            placed.count(port->name) == 0) {
-            if (const Pin* pin = firstFree(global)) {
-                give(*port, pin);
-            }
-        }
-    }
-    std::vector<const DesignPort*> rest;
-    std::set<std::string> busesDone;
-    for (const DesignPort* port : open) {
-        if (placed.count(port->name) != 0) {
-            continue;
-        }
-        if (port->clock || port->width <= 1) {
-            rest.push_back(port);
-            continue;
-        }
-        if (!busesDone.insert(port->bus).second) {
-            continue;
-        }
-        std::vector<const DesignPort*> bits;
-        for (const DesignPort* other : open) {
-            if (other->bus == port->bus && placed.count(other->name) == 0) {
-                bits.push_back(other);
-            }
-        }
-        std::sort(bits.begin(), bits.end(),
-                  [](const DesignPort* a, const DesignPort* b) { return a->bit < b->bit; });
-        // Ordinary pins when a bank has enough of them, else any free pins of one bank.
-        std::vector<const Pin*> room = bankFor(ordinary, bits.size());
-        if (room.empty()) {
-            room = bankFor(everyFree, bits.size());
-        }
-        if (room.empty()) {
-            rest.insert(rest.end(), bits.begin(), bits.end());
-            continue;
-        }
-        for (std::size_t i = 0; i < bits.size(); ++i) {
-            give(*bits[i], room[i]);
-        }
-    }
-    for (const DesignPort* port : rest) {
-        const Pin* pin = firstFree(ordinary);
-        if (pin == nullptr) {
-            pin = firstFree(global);
-        }
-        if (pin != nullptr) {
-            give(*port, pin);
-        }
-    }
-    pcf.AppendAll(given);
-    return given;
+    PinGiver giver(db, taken);
+    PlaceHardBlockPorts(db, design, pcf, open, taken, giver.Used(),
+                        [&](const DesignPort& port, const Pin* pin) { giver.Give(port, pin); });
+    giver.PlaceClocks(open);
+    giver.PlaceRest(giver.PlaceBuses(open));
+    pcf.AppendAll(giver.Given());
+    return giver.Given();
 }
 
 } // namespace VnTool

@@ -376,79 +376,23 @@ private:
             return true;
         }
         const Frame& parent = m_frames.back();
-        const std::string& key = parent.key;
         Role role = Role::Ignored;
-        auto object = [&](Role wanted, const char* what) {
-            if (array) {
-                return Fail("not a yosys netlist: " + std::string(what) + " is no object");
-            }
-            role = wanted;
-            return true;
-        };
         bool ok = true;
         switch (parent.role) {
         case Role::Root:
-            if (key == "modules") {
-                ok = object(Role::Modules, "\"modules\"");
-                m_sawModules = true;
-            }
-            break;
         case Role::Modules:
-            ok = object(Role::Module, ("module \"" + key + "\"").c_str());
-            if (ok) {
-                m_modules.push_back({});
-                m_modules.back().name = key;
-            }
-            break;
         case Role::Module:
-            if (key == "attributes") {
-                ok = object(Role::Attributes, "\"attributes\"");
-            } else if (key == "ports") {
-                ok = object(Role::Ports, "\"ports\"");
-            } else if (key == "cells") {
-                ok = object(Role::Cells, "\"cells\"");
-            }
+            ok = OpenInModules(parent.role, parent.key, array, role);
             break;
         case Role::Ports:
-            ok = object(Role::Port, ("port \"" + key + "\"").c_str());
-            if (ok) {
-                RawPort port;
-                port.name = key;
-                port.line = m_input.Line();
-                m_modules.back().ports.push_back(std::move(port));
-            }
-            break;
         case Role::Port:
-            if (key == "bits") {
-                if (!array) {
-                    return Fail("not a yosys netlist: the bits of port \"" +
-                                m_modules.back().ports.back().name + "\" are no array");
-                }
-                m_modules.back().ports.back().sawBits = true;
-                role = Role::PortBits;
-            }
-            break;
         case Role::PortBits:
-            return Fail("not a yosys netlist: port bits must be numbers or constants");
+            ok = OpenInPorts(parent.role, parent.key, array, role);
+            break;
         case Role::Cells:
-            if (!array) {
-                role = Role::Cell;
-                m_cellType.clear();
-                m_cellIoStandard.clear();
-                m_cellBits.clear();
-            }
-            break;
         case Role::Cell:
-            if (key == "connections" && !array) {
-                role = Role::Connections;
-            } else if (key == "parameters" && !array) {
-                role = Role::CellParameters;
-            }
-            break;
         case Role::Connections:
-            if (array && (IsClockConnectionName(key) || IsPadConnectionName(key))) {
-                role = Role::ClockBits;
-            }
+            role = OpenInCells(parent.role, parent.key, array);
             break;
         default:
             break;
@@ -458,6 +402,106 @@ private:
         }
         m_frames.push_back({role, {}});
         return true;
+    }
+
+    // A container the netlist needs to be an object: `role` becomes `wanted` when it is.
+    bool ObjectRole(bool array, Role wanted, const std::string& what, Role& role) {
+        if (array) {
+            return Fail("not a yosys netlist: " + what + " is no object");
+        }
+        role = wanted;
+        return true;
+    }
+
+    // The document, its modules and their sections; a module starts with its name.
+    bool OpenInModules(Role parent, const std::string& key, bool array, Role& role) {
+        switch (parent) {
+        case Role::Root:
+            if (key == "modules") {
+                m_sawModules = true;
+                return ObjectRole(array, Role::Modules, "\"modules\"", role);
+            }
+            return true;
+        case Role::Modules:
+            if (!ObjectRole(array, Role::Module, "module \"" + key + "\"", role)) {
+                return false;
+            }
+            m_modules.push_back({});
+            m_modules.back().name = key;
+            return true;
+        case Role::Module:
+            if (key == "attributes") {
+                return ObjectRole(array, Role::Attributes, "\"attributes\"", role);
+            }
+            if (key == "ports") {
+                return ObjectRole(array, Role::Ports, "\"ports\"", role);
+            }
+            if (key == "cells") {
+                return ObjectRole(array, Role::Cells, "\"cells\"", role);
+            }
+            return true;
+        default:
+            return true;
+        }
+    }
+
+    // A module's ports, each starting with its name and line, and a port's bits.
+    bool OpenInPorts(Role parent, const std::string& key, bool array, Role& role) {
+        switch (parent) {
+        case Role::Ports: {
+            if (!ObjectRole(array, Role::Port, "port \"" + key + "\"", role)) {
+                return false;
+            }
+            RawPort port;
+            port.name = key;
+            port.line = m_input.Line();
+            m_modules.back().ports.push_back(std::move(port));
+            return true;
+        }
+        case Role::Port:
+            if (key == "bits") {
+                if (!array) {
+                    return Fail("not a yosys netlist: the bits of port \"" +
+                                m_modules.back().ports.back().name + "\" are no array");
+                }
+                m_modules.back().ports.back().sawBits = true;
+                role = Role::PortBits;
+            }
+            return true;
+        case Role::PortBits:
+            return Fail("not a yosys netlist: port bits must be numbers or constants");
+        default:
+            return true;
+        }
+    }
+
+    // A module's cells: of a cell only its type, its parameters and the connections that
+    // can be a clock or a pad are read; a new cell forgets the last one's.
+    Role OpenInCells(Role parent, const std::string& key, bool array) {
+        switch (parent) {
+        case Role::Cells:
+            if (array) {
+                return Role::Ignored;
+            }
+            m_cellType.clear();
+            m_cellIoStandard.clear();
+            m_cellBits.clear();
+            return Role::Cell;
+        case Role::Cell:
+            if (key == "connections" && !array) {
+                return Role::Connections;
+            }
+            if (key == "parameters" && !array) {
+                return Role::CellParameters;
+            }
+            return Role::Ignored;
+        case Role::Connections:
+            return array && (IsClockConnectionName(key) || IsPadConnectionName(key))
+                       ? Role::ClockBits
+                       : Role::Ignored;
+        default:
+            return Role::Ignored;
+        }
     }
 
     bool FinishPort() {
