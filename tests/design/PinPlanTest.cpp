@@ -311,6 +311,36 @@ TEST(HardBlocks, EachBrokenRuleIsAnErrorNamingThePinsThatWouldBeRight) {
                                        "package"});
 }
 
+// An SB_GB_IO's pad feeds a global buffer directly, so only the pins wired to one can hold
+// it; a board file's -nowarn line is held to that as much as any other.
+TEST(HardBlocks, AGlobalBufferPadCellIsRefusedOffTheGlobalBufferPinsAndKeptOnThem) {
+    ChipDb db = Device();
+    Design design;
+    design.ports = {PadPort("gclk", VnTool::PadUse::GlobalBuffer), Port("x", -1, 1)};
+    design.ports[0].padCell = "SB_GB_IO";
+    for (const char* pin : {"9", "1"}) {
+        auto problems = Messages(
+            VnTool::CheckPins(db, design, "top.json",
+                              Pcf(std::string("set_io x 2\nset_io -nowarn gclk ") + pin + "\n"),
+                              VnTool::CheckOptions{}));
+        EXPECT_EQ(
+            problems,
+            std::vector<std::string>{"p.pcf:2: error: port 'gclk' is an SB_GB_IO, whose pad must "
+                                     "drive a global buffer: 8, 10"})
+            << pin;
+    }
+    for (const char* pin : {"8", "10"}) {
+        PcfFile pcf = Pcf(std::string("set_io x 2\nset_io -nowarn gclk ") + pin + "\n");
+        EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}).empty())
+            << pin;
+    }
+    // Left to the tool, it lands on one of them.
+    PcfFile pcf = Pcf("");
+    auto given = VnTool::AutoAssign(db, design, pcf);
+    EXPECT_EQ(given, (std::vector<std::pair<std::string, std::string>>{{"gclk", "8"}, {"x", "1"}}));
+    EXPECT_TRUE(VnTool::CheckPins(db, design, "top.json", pcf, VnTool::CheckOptions{}).empty());
+}
+
 // A bus goes to the first bank with room for all of it, the last bank included.
 TEST(AutoAssign, ABusFitsWhenOnlyTheLastBankHasRoom) {
     ChipDb db = Device();
