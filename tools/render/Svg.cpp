@@ -161,7 +161,9 @@ void SvgWriter::Text(double x, double y, std::string_view text, double size,
     if (fill != "#000000") {
         m_body += " fill=\"" + fill + "\"";
     }
-    m_body += ">" + XmlEscape(text) + "</text>\n";
+    m_body += '>';
+    m_body += XmlEscape(text);
+    m_body += "</text>\n";
 }
 
 void SvgWriter::Polygon(const std::vector<std::pair<double, double>>& points,
@@ -169,7 +171,12 @@ void SvgWriter::Polygon(const std::vector<std::pair<double, double>>& points,
                         const std::string& stroke, double strokeWidth) {
     std::string list;
     for (const auto& [x, y] : points) {
-        list += (list.empty() ? "" : " ") + Num(x) + "," + Num(y);
+        if (!list.empty()) {
+            list += ' ';
+        }
+        list += Num(x);
+        list += ',';
+        list += Num(y);
     }
     m_body += "<polygon class=\"" + XmlEscape(cssClass) + "\" points=\"" + list + "\" fill=\"" +
               fill + "\" stroke=\"" + stroke + "\" stroke-width=\"" + Num(strokeWidth) + "\">" +
