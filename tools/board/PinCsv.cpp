@@ -1,5 +1,6 @@
 //===-- tools/board/PinCsv.cpp - the pin plan as a table, and tables read back ---===//
 #include "PinCsv.h"
+#include "SourceLine.h"
 
 #include "PinPlan.h"
 
@@ -133,8 +134,8 @@ bool ParseCsv(std::string_view text, std::string_view source,
         }
         if (c == '"') {
             if (!field.empty() || wasQuoted) {
-                error = std::string(source) + ":" + std::to_string(line) +
-                        ": a quote inside a field that is not quoted as a whole";
+                error =
+                    AtLine(source, line, "a quote inside a field that is not quoted as a whole");
                 return false;
             }
             quoted = wasQuoted = any = true;
@@ -151,8 +152,7 @@ bool ParseCsv(std::string_view text, std::string_view source,
             endRecord();
             ++line;
         } else if (wasQuoted) {
-            error = std::string(source) + ":" + std::to_string(line) +
-                    ": text after a quoted field's closing quote";
+            error = AtLine(source, line, "text after a quoted field's closing quote");
             return false;
         } else {
             field += c;
@@ -160,8 +160,7 @@ bool ParseCsv(std::string_view text, std::string_view source,
         }
     }
     if (quoted) {
-        error = std::string(source) + ":" + std::to_string(quoteLine) +
-                ": the quoted field opened here never closes";
+        error = AtLine(source, quoteLine, "the quoted field opened here never closes");
         return false;
     }
     endRecord();

@@ -1,5 +1,6 @@
 //===-- tools/board/SExpr.cpp - the S-expressions of KiCad's files -----------------===//
 #include "SExpr.h"
+#include "SourceLine.h"
 
 namespace VnTool {
 
@@ -30,7 +31,7 @@ public:
 
 private:
     bool Fail(const std::string& why, std::string& error) const {
-        error = std::string(m_source) + ":" + std::to_string(m_line) + ": " + why;
+        error = AtLine(m_source, m_line, why);
         return false;
     }
 

@@ -1,5 +1,6 @@
 //===-- tools/board/Xml.cpp - a small reader of the XML KiCad writes its netlists in ---===//
 #include "Xml.h"
+#include "SourceLine.h"
 
 #include <algorithm>
 #include <cstdint>
@@ -52,7 +53,7 @@ public:
 
 private:
     bool Fail(const std::string& why, std::string& error) const {
-        error = std::string(m_source) + ":" + std::to_string(m_line) + ": " + why;
+        error = AtLine(m_source, m_line, why);
         return false;
     }
     bool Starts(std::string_view what) const { return m_text.substr(m_at, what.size()) == what; }

@@ -1,5 +1,6 @@
 //===-- tools/chipdb/ChipDb.cpp - reads the tiles and package pins of a chip database ---===//
 #include "ChipDb.h"
+#include "SourceLine.h"
 #include "Suggest.h"
 
 #include "Port/SafeFile.h"
@@ -153,8 +154,8 @@ public:
             return false;
         }
         if (m_cutShort) {
-            error = std::string(m_source) + ":" + std::to_string(m_line) +
-                    ": the last line has no line end: the file is cut short";
+            error =
+                AtLine(m_source, m_line, "the last line has no line end: the file is cut short");
             return false;
         }
         // Every place of the grid but the four corners holds a tile; fewer means the file
@@ -162,18 +163,19 @@ public:
         const std::size_t expected = static_cast<std::size_t>(m_db.width) * m_db.height -
                                      (m_db.width > 1 && m_db.height > 1 ? 4 : 0);
         if (m_tilesPlaced != expected) {
-            error = std::string(m_source) + ":" + std::to_string(m_line) + ": the file ends with " +
-                    std::to_string(m_tilesPlaced) + " of the " + std::to_string(expected) +
-                    " tiles of a " + std::to_string(m_db.width) + " x " +
-                    std::to_string(m_db.height) + " device: it is cut short or damaged";
+            error = AtLine(m_source, m_line,
+                           "the file ends with " + std::to_string(m_tilesPlaced) + " of the " +
+                               std::to_string(expected) + " tiles of a " +
+                               std::to_string(m_db.width) + " x " + std::to_string(m_db.height) +
+                               " device: it is cut short or damaged");
             return false;
         }
         // Pins come before the tiles in the file, so their tiles are checked at the end.
         for (Pin& pin : m_db.pins) {
             if (m_grid[Cell(pin.x, pin.y)] != kIoCell) {
-                error = std::string(m_source) + ":" + std::to_string(pin.line) + ": pin " +
-                        pin.name + " lies on " + std::to_string(pin.x) + " " +
-                        std::to_string(pin.y) + ", which is no IO tile";
+                error = AtLine(m_source, pin.line,
+                               "pin " + pin.name + " lies on " + std::to_string(pin.x) + " " +
+                                   std::to_string(pin.y) + ", which is no IO tile");
                 return false;
             }
         }
@@ -205,7 +207,7 @@ private:
     bool Fail(const std::string& why) {
         if (!m_failed) {
             m_failed = true;
-            m_error = std::string(m_source) + ":" + std::to_string(m_line) + ": " + why;
+            m_error = AtLine(m_source, m_line, why);
         }
         return false;
     }

@@ -13,8 +13,9 @@
 
 namespace VnTool {
 
-/// "SOURCE:LINE: TEXT".
-inline std::string AtLine(std::string_view source, long long line, std::string_view text) {
+/// "SOURCE:LINE: TEXT". Any integer type of line number, as each reader counts its own.
+template <class Line>
+std::string AtLine(std::string_view source, Line line, std::string_view text) {
     std::string message(source);
     message += ':';
     message += std::to_string(line);

@@ -1,5 +1,6 @@
 //===-- tools/design/Pcf.cpp - pin constraint files as nextpnr-ice40 reads them ---===//
 #include "Pcf.h"
+#include "SourceLine.h"
 
 #include "Port/SafeFile.h"
 
@@ -228,7 +229,7 @@ bool PcfFile::Parse(std::string_view text, std::string_view source, std::string&
             }
         }
         if (!why.empty()) {
-            error = m_source + ":" + std::to_string(line.number) + ": " + why;
+            error = AtLine(m_source, line.number, why);
             m_lines.clear();
             return false;
         }

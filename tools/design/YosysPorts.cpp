@@ -1,5 +1,6 @@
 //===-- tools/design/YosysPorts.cpp - the top-level ports of a yosys netlist ---===//
 #include "YosysPorts.h"
+#include "SourceLine.h"
 
 #include "Port/SafeFile.h"
 
@@ -288,7 +289,7 @@ public:
         }
         auto colon = text.find(": ", at == std::string::npos ? 0 : at);
         std::string why = colon == std::string::npos ? text : text.substr(colon + 2);
-        m_error = std::string(m_source) + ":" + std::to_string(line) + ": malformed JSON: " + why;
+        m_error = AtLine(m_source, line, "malformed JSON: " + why);
         return false;
     }
 
@@ -298,7 +299,7 @@ public:
 private:
     bool Fail(const std::string& why) {
         if (m_error.empty()) {
-            m_error = std::string(m_source) + ":" + std::to_string(m_input.Line()) + ": " + why;
+            m_error = AtLine(m_source, m_input.Line(), why);
         }
         return false;
     }
@@ -507,15 +508,15 @@ private:
     bool FinishPort() {
         RawPort& port = m_modules.back().ports.back();
         if (port.direction != "input" && port.direction != "output" && port.direction != "inout") {
-            m_error =
-                std::string(m_source) + ":" + std::to_string(port.line) +
-                ": not a yosys netlist: port \"" + port.name + "\" has " +
-                (port.direction.empty() ? "no direction" : "direction \"" + port.direction + "\"");
+            m_error = AtLine(m_source, port.line,
+                             "not a yosys netlist: port \"" + port.name + "\" has " +
+                                 (port.direction.empty() ? "no direction"
+                                                         : "direction \"" + port.direction + "\""));
             return false;
         }
         if (!port.sawBits) {
-            m_error = std::string(m_source) + ":" + std::to_string(port.line) +
-                      ": not a yosys netlist: port \"" + port.name + "\" has no bits";
+            m_error = AtLine(m_source, port.line,
+                             "not a yosys netlist: port \"" + port.name + "\" has no bits");
             return false;
         }
         return true;
@@ -641,9 +642,10 @@ bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, s
         // The bits are named by index: an index that does not fit an int cannot be named.
         const long long last = static_cast<long long>(raw.bits.size()) - 1;
         if (raw.offset < INT_MIN || raw.offset > INT_MAX || raw.offset > INT_MAX - last) {
-            error = std::string(source) + ":" + std::to_string(raw.line) + ": port \"" + raw.name +
-                    "\" has bit offset " + std::to_string(raw.offset) +
-                    ", beyond the indices a constraint can name";
+            error =
+                AtLine(source, raw.line,
+                       "port \"" + raw.name + "\" has bit offset " + std::to_string(raw.offset) +
+                           ", beyond the indices a constraint can name");
             return false;
         }
         PortDirection direction = raw.direction == "input"    ? PortDirection::Input
