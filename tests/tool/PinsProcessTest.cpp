@@ -433,11 +433,12 @@ TEST_F(PinsProcess, NamesAConstraintFileCannotHoldAreRefusedAndNamesAreShownEsca
     EXPECT_FALSE(Contains(shown.out, "\x1b")) << shown.out;
 }
 
-// The check is one pass over lines and ports: eight times the bits take about eight times
-// as long (a little more as the memory grows past the caches), where a pass that compares
-// every bit with every line takes sixty-four times as long.
-TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
-    auto timed = [&](int bits) {
+// The check and the picture are one pass over lines and ports: eight times the bits take
+// about eight times as long (a little more as the memory grows past the caches), where a
+// pass that compares every bit with every line, or looks each port up in a list, takes
+// sixty-four times as long.
+TEST_F(PinsProcess, TheCheckAndThePictureTakeTimeInProportionToThePortBits) {
+    auto timed = [&](int bits, const std::string& command = "check") {
         std::string json = "{\"modules\": {\"top\": {\"attributes\": {\"top\": 1}, "
                            "\"ports\": {\"d\": {\"direction\": \"input\", \"bits\": [";
         std::string pcf;
@@ -449,15 +450,23 @@ TEST_F(PinsProcess, TheCheckTakesTimeInProportionToThePortBits) {
         WriteBytes(m_dir / "wide.json", json);
         WriteBytes(m_dir / "wide.pcf", pcf);
         auto start = std::chrono::steady_clock::now();
-        Result result =
-            Pins("check", (m_dir / "wide.pcf").string(), {}, (m_dir / "wide.json").string());
-        EXPECT_EQ(result.status, 1);
+        std::vector<std::string> extra;
+        if (command == "show") {
+            extra = {"--svg", (m_dir / "wide.svg").string()};
+        }
+        Result result = Pins(command.c_str(), (m_dir / "wide.pcf").string(), extra,
+                             (m_dir / "wide.json").string());
+        EXPECT_EQ(result.status, command == "check" ? 1 : 0) << result.err;
         return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
     };
     timed(1000); // the chip database's pages are warm for both runs
     double small = timed(5000);
     double large = timed(40000);
     EXPECT_LT(large, 12 * small + 0.5) << small << " s for 5000 bits, " << large << " s for 40000";
+    small = timed(5000, "show");
+    large = timed(40000, "show");
+    EXPECT_LT(large, 12 * small + 0.5)
+        << "show: " << small << " s for 5000 bits, " << large << " s for 40000";
 
     // More ports than pins: refused before any is placed, the file untouched.
     Snapshot before = Take(m_dir / "wide.pcf");

@@ -52,6 +52,9 @@ PortHolders::PortHolders(const Design& design) {
                             Adopt(Vn::Eng::PropertyFactory::CreateBoolProperty(port.clock, true)));
         holder->AddProperty("Pin", Adopt(Vn::Eng::PropertyFactory::CreateStringProperty("", true)));
         holder->AddProperty("Bank", Adopt(Vn::Eng::PropertyFactory::CreateIntProperty(-1, true)));
+        // A netlist names each bit once; should it not, the first keeps the name, as a
+        // walk in design order would find it.
+        m_byName.emplace(port.name, holder.get());
         m_holders.push_back(std::move(holder));
     }
 }
@@ -88,12 +91,8 @@ void PortHolders::ApplyPins(const ChipDb& db, const PcfFile& pcf) {
 }
 
 PortHolder* PortHolders::Find(const std::string& name) const {
-    for (const auto& holder : m_holders) {
-        if (holder->GetName().str() == name) {
-            return holder.get();
-        }
-    }
-    return nullptr;
+    auto found = m_byName.find(name);
+    return found == m_byName.end() ? nullptr : found->second;
 }
 
 std::list<VnI::IPropertyHolder*> PortHolders::List() const {

@@ -27,6 +27,7 @@
 #include <list>
 #include <memory>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 namespace VnTool {
@@ -73,6 +74,8 @@ private:
     std::vector<Port::StringBase<char>> m_directions;
     Vn::Eng::PropertyNameList m_names;
     std::vector<std::unique_ptr<PortHolder>> m_holders;
+    // By name, so that a plan of many ports looks each up in constant time.
+    std::unordered_map<std::string, PortHolder*> m_byName;
 };
 
 } // namespace VnTool
