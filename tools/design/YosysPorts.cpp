@@ -616,6 +616,22 @@ const char* PortDirectionName(PortDirection direction) {
     return "?";
 }
 
+namespace {
+
+// The bits are named by index: an index that does not fit an int cannot be named.
+bool OffsetFits(const RawPort& raw, std::string_view source, std::string& error) {
+    const long long last = static_cast<long long>(raw.bits.size()) - 1;
+    if (raw.offset < INT_MIN || raw.offset > INT_MAX || raw.offset > INT_MAX - last) {
+        error = AtLine(source, raw.line,
+                       "port \"" + raw.name + "\" has bit offset " + std::to_string(raw.offset) +
+                           ", beyond the indices a constraint can name");
+        return false;
+    }
+    return true;
+}
+
+} // namespace
+
 bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, std::string& error) {
     design = Design{};
     CountingSource input(in);
@@ -639,13 +655,7 @@ bool ReadYosysPorts(std::istream& in, std::string_view source, Design& design, s
     design.twoOutputPlls = top->twoOutputPlls;
     design.ledDriver = top->ledDriver;
     for (const RawPort& raw : top->ports) {
-        // The bits are named by index: an index that does not fit an int cannot be named.
-        const long long last = static_cast<long long>(raw.bits.size()) - 1;
-        if (raw.offset < INT_MIN || raw.offset > INT_MAX || raw.offset > INT_MAX - last) {
-            error =
-                AtLine(source, raw.line,
-                       "port \"" + raw.name + "\" has bit offset " + std::to_string(raw.offset) +
-                           ", beyond the indices a constraint can name");
+        if (!OffsetFits(raw, source, error)) {
             return false;
         }
         PortDirection direction = raw.direction == "input"    ? PortDirection::Input
