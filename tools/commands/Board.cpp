@@ -29,46 +29,17 @@ const char kFromBoard[] = "pins from-board";
 const char kExport[] = "pins export";
 const char kImport[] = "pins import";
 
-struct BoardPlan {
-    DeviceSource source;
-    std::unique_ptr<DeviceModel> model;
-    std::string designPath;
-    std::string pcfPath;
-    Design design;
-    PcfFile pcf;
-    bool pcfExisted = true;
+struct BoardPlan : PinFiles {
     std::vector<std::string> inputs; ///< every file read, never to be written over
 };
 
+// `plan.inputs` holds the board's files on the way in; the constraint file may be none of
+// them either.
 int LoadPlan(const std::string& command, const ParsedArgs& args, BoardPlan& plan) {
-    plan.designPath = args.Value("--design");
-    plan.pcfPath = args.Value("--pcf");
-    if (plan.designPath.empty()) {
-        return UsageError(command, "--design D.json is needed (yosys -p \"synth_ice40 -top top "
-                                   "-json D.json\" makes one)");
-    }
-    if (plan.pcfPath.empty()) {
-        return UsageError(command, "--pcf P.pcf is needed");
-    }
-    if (int status = OpenDevice(command, args, plan.source, plan.model); status != kExitOk) {
+    if (int status = LoadPinFiles(command, args, true, plan, plan.inputs); status != kExitOk) {
         return status;
     }
     plan.inputs.insert(plan.inputs.end(), {plan.designPath, plan.source.chipDb});
-    std::error_code ec;
-    for (const std::string& input : plan.inputs) {
-        if (std::filesystem::equivalent(plan.pcfPath, input, ec) && !ec) {
-            return Refused(command, plan.pcfPath + " is " + input +
-                                        ", not a constraint file; give the .pcf file to --pcf");
-        }
-    }
-    std::string error;
-    if (!ReadYosysPortsFile(plan.designPath, plan.design, error)) {
-        return Refused(command, error);
-    }
-    plan.pcfExisted = std::filesystem::exists(std::filesystem::symlink_status(plan.pcfPath, ec));
-    if (!plan.pcf.ParseFile(plan.pcfPath, error, true)) {
-        return Refused(command, error);
-    }
     return kExitOk;
 }
 

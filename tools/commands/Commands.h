@@ -6,6 +6,8 @@
 #include "DeviceModel.h"
 #include "DeviceOptions.h"
 #include "DeviceSearch.h"
+#include "Pcf.h"
+#include "YosysPorts.h"
 
 #include <memory>
 #include <string>
@@ -69,6 +71,24 @@ std::vector<OptionSyntax> ViewOptionSyntax();
 
 /// Reads --view and --bottom into `request`. Returns kExitOk, or kExitUsage after reporting.
 int ParseViewArgs(const std::string& command, const ParsedArgs& args, DrawRequest& request);
+
+/// What every pins command reads: the device, the design and the constraint file.
+struct PinFiles {
+    DeviceSource source;
+    std::unique_ptr<DeviceModel> model;
+    std::string designPath;
+    std::string pcfPath;
+    Design design;
+    PcfFile pcf;
+    bool pcfExisted = true;
+};
+
+/// Reads --design, --pcf and the device options. The constraint file may never be the
+/// netlist, the chip database or one of `alsoRead`; a missing one is empty when
+/// `missingPcfIsEmpty`. Returns kExitOk, or the status of the usage error or refusal it
+/// has reported.
+int LoadPinFiles(const std::string& command, const ParsedArgs& args, bool missingPcfIsEmpty,
+                 PinFiles& plan, const std::vector<std::string>& alsoRead = {});
 
 /// Writes `text` to `path` through the safe writer, never over one of `inputs` (the files
 /// the command read) nor the colour scheme: DeviceModel::FilesNeverReplaced.

@@ -92,4 +92,40 @@ int DrawDevice(const std::string& command, DeviceModel& model, const DrawRequest
     return kExitOk;
 }
 
+int LoadPinFiles(const std::string& command, const ParsedArgs& args, bool missingPcfIsEmpty,
+                 PinFiles& plan, const std::vector<std::string>& alsoRead) {
+    plan.designPath = args.Value("--design");
+    plan.pcfPath = args.Value("--pcf");
+    if (plan.designPath.empty()) {
+        return UsageError(command, "--design D.json is needed (yosys -p \"synth_ice40 -top top "
+                                   "-json D.json\" makes one)");
+    }
+    if (plan.pcfPath.empty()) {
+        return UsageError(command, "--pcf P.pcf is needed");
+    }
+    if (int status = OpenDevice(command, args, plan.source, plan.model); status != kExitOk) {
+        return status;
+    }
+    // The constraint file is the one file a pins command may write: it must never be one
+    // of the files it reads as something else.
+    std::error_code ec;
+    std::vector<std::string> inputs = alsoRead;
+    inputs.insert(inputs.end(), {plan.designPath, plan.source.chipDb});
+    for (const std::string& input : inputs) {
+        if (std::filesystem::equivalent(plan.pcfPath, input, ec) && !ec) {
+            return Refused(command, plan.pcfPath + " is " + input +
+                                        ", not a constraint file; give the .pcf file to --pcf");
+        }
+    }
+    std::string error;
+    if (!ReadYosysPortsFile(plan.designPath, plan.design, error)) {
+        return Refused(command, error);
+    }
+    plan.pcfExisted = std::filesystem::exists(std::filesystem::symlink_status(plan.pcfPath, ec));
+    if (!plan.pcf.ParseFile(plan.pcfPath, error, missingPcfIsEmpty)) {
+        return Refused(command, error);
+    }
+    return kExitOk;
+}
+
 } // namespace VnTool

@@ -32,48 +32,10 @@ const char kShow[] = "pins show";
 
 using Assignments = std::vector<std::pair<std::string, std::string>>;
 
-// What every pins command reads.
-struct Plan {
-    DeviceSource source;
-    std::unique_ptr<DeviceModel> model;
-    std::string designPath;
-    std::string pcfPath;
-    Design design;
-    PcfFile pcf;
-    bool pcfExisted = true;
-};
+using Plan = PinFiles;
 
 int Load(const std::string& command, const ParsedArgs& args, bool missingPcfIsEmpty, Plan& plan) {
-    plan.designPath = args.Value("--design");
-    plan.pcfPath = args.Value("--pcf");
-    if (plan.designPath.empty()) {
-        return UsageError(command, "--design D.json is needed (yosys -p \"synth_ice40 -top top "
-                                   "-json D.json\" makes one)");
-    }
-    if (plan.pcfPath.empty()) {
-        return UsageError(command, "--pcf P.pcf is needed");
-    }
-    if (int status = OpenDevice(command, args, plan.source, plan.model); status != kExitOk) {
-        return status;
-    }
-    // The constraint file is the one file a pins command may write: it must never be one
-    // of the files it reads as something else.
-    std::error_code ec;
-    for (const std::string& input : {plan.designPath, plan.source.chipDb}) {
-        if (std::filesystem::equivalent(plan.pcfPath, input, ec) && !ec) {
-            return Refused(command, plan.pcfPath + " is " + input +
-                                        ", not a constraint file; give the .pcf file to --pcf");
-        }
-    }
-    std::string error;
-    if (!ReadYosysPortsFile(plan.designPath, plan.design, error)) {
-        return Refused(command, error);
-    }
-    plan.pcfExisted = std::filesystem::exists(std::filesystem::symlink_status(plan.pcfPath, ec));
-    if (!plan.pcf.ParseFile(plan.pcfPath, error, missingPcfIsEmpty)) {
-        return Refused(command, error);
-    }
-    return kExitOk;
+    return LoadPinFiles(command, args, missingPcfIsEmpty, plan);
 }
 
 void PrintDevice(const Plan& plan) {
