@@ -6,6 +6,7 @@
 //
 //===------------------------------------------------------------------------------===//
 #include "BoardTestSupport.h"
+#include "NextpnrBels.h"
 #include "ProcessHelpers.h"
 
 #include <gtest/gtest.h>
@@ -16,7 +17,6 @@
 #include <cstdlib>
 #include <filesystem>
 #include <map>
-#include <regex>
 
 namespace {
 
@@ -91,10 +91,7 @@ protected:
                            " 2>&1";
         int raw = std::system(line.c_str());
         log = Slurp(logFile);
-        static const std::regex kConstrained("constrained '([^']+)' to bel '([^']+)'");
-        for (std::sregex_iterator it(log.begin(), log.end(), kConstrained), end; it != end; ++it) {
-            bels[(*it)[1]] = (*it)[2];
-        }
+        bels = VnTest::ConstrainedBels(log);
         return WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
     }
 
@@ -126,16 +123,7 @@ TEST_F(BoardProcess, NextpnrPlacesABoardFilesPlanExactlyAsPlanned) {
     ASSERT_EQ(Place(bels, log), 0) << log;
     ASSERT_EQ(bels.count("spare"), 1u) << log;
     bels.erase("spare");
-    std::map<std::string, std::string> expected;
-    for (const auto& [port, pinName] : kPlan) {
-        for (const auto& pin : BoardTest::OneK().pins) {
-            if (pin.name == pinName) {
-                expected[port] = "X" + std::to_string(pin.x) + "/Y" + std::to_string(pin.y) +
-                                 "/io" + std::to_string(pin.pio);
-            }
-        }
-    }
-    EXPECT_EQ(bels, expected) << log;
+    EXPECT_EQ(bels, VnTest::PlannedBels(BoardTest::OneK(), kPlan)) << log;
 }
 
 TEST_F(BoardProcess, ADisagreeingConstraintFileWaitsForPrefer) {

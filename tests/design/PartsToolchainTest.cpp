@@ -7,6 +7,7 @@
 // icepack must pack the result. The netlists are made once per build tree.
 //
 //===------------------------------------------------------------------------------===//
+#include "NextpnrBels.h"
 #include "PinPlan.h"
 
 #include <gtest/gtest.h>
@@ -170,21 +171,8 @@ TEST_P(EveryPart, AnAutoPlanOfEachPackageIsPlacedPinForPinAndPacked) {
                   0)
             << pcf.Text() << ReadAll(log);
         std::string placed = ReadAll(log);
-        std::map<std::string, std::string> bels;
-        static const std::regex kConstrained("constrained '([^']+)' to bel '([^']+)'");
-        for (std::sregex_iterator it(placed.begin(), placed.end(), kConstrained), end; it != end;
-             ++it) {
-            bels[(*it)[1]] = (*it)[2];
-        }
-        std::map<std::string, std::string> expected;
-        for (const auto& [port, pinName] : given) {
-            for (const auto& pin : db.pins) {
-                if (pin.name == pinName) {
-                    expected[port] = "X" + std::to_string(pin.x) + "/Y" + std::to_string(pin.y) +
-                                     "/io" + std::to_string(pin.pio);
-                }
-            }
-        }
+        const auto bels = VnTest::ConstrainedBels(placed);
+        const auto expected = VnTest::PlannedBels(db, given);
         EXPECT_EQ(bels, expected) << pcf.Text();
         // The LED driver's outputs are no SB_IO, by design; any other port nextpnr declines
         // to give an SB_IO was planned on a pad it does not use.

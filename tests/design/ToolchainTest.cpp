@@ -6,6 +6,7 @@
 // database gives its pin, and icepack makes a bitstream of the result.
 //
 //===------------------------------------------------------------------------------===//
+#include "NextpnrBels.h"
 #include "PinPlan.h"
 
 #include <gtest/gtest.h>
@@ -15,7 +16,6 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
-#include <regex>
 #include <sstream>
 
 #include <sys/wait.h>
@@ -150,10 +150,7 @@ protected:
                                     pcf.string() + "' --asc '" + asc.string() + "'",
                                 logFile);
         log = ReadAll(logFile);
-        static const std::regex kConstrained("constrained '([^']+)' to bel '([^']+)'");
-        for (std::sregex_iterator it(log.begin(), log.end(), kConstrained), end; it != end; ++it) {
-            bels[(*it)[1]] = (*it)[2];
-        }
+        bels = VnTest::ConstrainedBels(log);
         return status;
     }
 
@@ -176,15 +173,7 @@ protected:
         std::map<std::string, std::string> bels;
         std::string log;
         ASSERT_EQ(Place(target, pcf.Text(), target.name, bels, log), 0) << log;
-        std::map<std::string, std::string> expected;
-        for (const auto& [port, pinName] : given) {
-            for (const auto& pin : db.pins) {
-                if (pin.name == pinName) {
-                    expected[port] = "X" + std::to_string(pin.x) + "/Y" + std::to_string(pin.y) +
-                                     "/io" + std::to_string(pin.pio);
-                }
-            }
-        }
+        const auto expected = VnTest::PlannedBels(db, given);
         EXPECT_EQ(bels, expected) << log;
 
         fs::path asc = s_folder / (std::string(target.name) + ".asc");
